@@ -1,0 +1,53 @@
+# A subsystem is a folder below src/. It becomes one object library, and it may include only its own headers and
+# those of the subsystems that it names behind USES; a forbidden include stops the build.
+
+# orbek_subsystem(<folder> [USES <folder>...] [LIBRARIES <target>...])
+#
+# Defines the object library orbek_<folder, "/" replaced by "_"> from all sources below src/<folder>, without those
+# of a subsystem that lies deeper. A subsystem that lies deeper is declared after the one around it.
+function(orbek_subsystem folder)
+    cmake_parse_arguments(PARSE_ARGV 1 arg "" "" "USES;LIBRARIES")
+    string(REPLACE "/" "_" target "orbek_${folder}")
+    set(root ${CMAKE_SOURCE_DIR}/src/${folder})
+
+    file(GLOB_RECURSE sources CONFIGURE_DEPENDS ${root}/*.cpp)
+    file(GLOB_RECURSE headers CONFIGURE_DEPENDS ${root}/*.h)
+    if(folder STREQUAL "fn")
+        list(FILTER sources EXCLUDE REGEX "/src/fn/deployment/")
+        list(FILTER headers EXCLUDE REGEX "/src/fn/deployment/")
+    endif()
+
+    set(stamp ${CMAKE_CURRENT_BINARY_DIR}/${target}.layers)
+    set(allowed ${folder} ${arg_USES})
+    add_custom_command(
+        OUTPUT ${stamp}
+        COMMAND ${CMAKE_COMMAND} "-DALLOWED=${allowed}" "-DFILES=${sources};${headers}" -DSTAMP=${stamp}
+                -P ${CMAKE_SOURCE_DIR}/cmake/check_layers.cmake
+        DEPENDS ${sources} ${headers} ${CMAKE_SOURCE_DIR}/cmake/check_layers.cmake
+        COMMENT "Checking what ${folder} includes"
+        VERBATIM)
+
+    add_library(${target} OBJECT ${sources} ${stamp})
+    target_include_directories(${target} PUBLIC ${CMAKE_SOURCE_DIR}/src)
+    target_link_libraries(${target} PUBLIC ${arg_LIBRARIES})
+
+    # The objects of a used object library do not travel along; whoever links asks for the whole set.
+    set(closure ${target})
+    foreach(used IN LISTS arg_USES)
+        string(REPLACE "/" "_" used_target "orbek_${used}")
+        get_target_property(below ${used_target} ORBEK_CLOSURE)
+        list(APPEND closure ${below})
+        foreach(library IN LISTS below)
+            target_link_libraries(${target} PUBLIC $<TARGET_PROPERTY:${library},INTERFACE_LINK_LIBRARIES>)
+        endforeach()
+    endforeach()
+    list(REMOVE_DUPLICATES closure)
+    set_target_properties(${target} PROPERTIES ORBEK_CLOSURE "${closure}")
+endfunction()
+
+# orbek_link(<target> <folder>): links the objects of a subsystem and of all that it uses.
+function(orbek_link target folder)
+    string(REPLACE "/" "_" subsystem "orbek_${folder}")
+    get_target_property(closure ${subsystem} ORBEK_CLOSURE)
+    target_link_libraries(${target} PRIVATE ${closure})
+endfunction()

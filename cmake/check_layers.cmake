@@ -1,0 +1,23 @@
+# Run by the build for each subsystem: every project include of FILES must lead into a folder of ALLOWED.
+cmake_minimum_required(VERSION 3.25)
+
+foreach(file IN LISTS FILES)
+    if(NOT EXISTS ${file})
+        continue()
+    endif()
+    file(STRINGS ${file} includes REGEX "^[ \t]*#[ \t]*include[ \t]+\"")
+    foreach(line IN LISTS includes)
+        string(REGEX REPLACE "^[^\"]*\"([^\"]*)\".*" "\\1" path "${line}")
+        # fn/deployment is a subsystem of its own inside fn's folder.
+        if(path MATCHES "^fn/deployment/")
+            set(subsystem "fn/deployment")
+        else()
+            string(REGEX REPLACE "/.*" "" subsystem "${path}")
+        endif()
+        if(NOT subsystem IN_LIST ALLOWED)
+            list(GET ALLOWED 0 own)
+            message(FATAL_ERROR "${file} includes \"${path}\": ${own} may include only ${ALLOWED}, by path from src/")
+        endif()
+    endforeach()
+endforeach()
+file(TOUCH ${STAMP})
