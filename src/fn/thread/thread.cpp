@@ -7,7 +7,6 @@
 #include <climits>
 #include <memory>
 
-#include <cxxabi.h>
 #include <fcntl.h>
 #include <poll.h>
 #include <unistd.h>
@@ -173,9 +172,8 @@ void FNThreadImpl::run() {
         setState(FNThreadState::ended, "Cancelled.");
     } catch (const std::exception& e) {
         setState(FNThreadState::failed, e.what());
-    } catch (const abi::__forced_unwind&) {
-        throw; // terminate() unwinds the stack by this, and must not be stopped
     } catch (...) {
+        if (!std::current_exception()) throw; // terminate() unwinds the stack, and must not be stopped
         setState(FNThreadState::failed, "Unknown exception.");
     }
 }
