@@ -1,7 +1,7 @@
 // Cost of configurations: opening, reading a key, and changes that must not wait for the disk.
 
-#include "fn/deployment/app_file_config_db.h"
 #include "orbek/configuration.h"
+#include "fn/deployment/app_file_config_db.h"
 
 #include <benchmark/benchmark.h>
 
@@ -15,7 +15,8 @@ class File {
 public:
     File() : name_(std::filesystem::temp_directory_path() / "orbek-bench.conf") {
         std::ofstream file(name_);
-        file << "# made by the benchmark\nORBEK.Substitutions.INSTALLDIR = /opt/orbek\nORBEK.CaptureDevices = ";
+        file << "# made by the benchmark\nORBEK.Substitutions.INSTALLDIR = /opt/orbek\nORBEK.CaptureDevices "
+                "= ";
         for (int i = 0; i < 98; ++i) file << "Camera" << i << " ";
         file << "\n";
         for (int i = 0; i < 98; ++i)

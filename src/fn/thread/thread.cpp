@@ -127,7 +127,7 @@ void FNThreadImpl::start(const FNCountedPtr<FNThreadImpl>& self) {
     Attributes attributes;
     setStackSize(attributes.attributes);
     const FNEvent started;
-    auto launch = std::make_unique<Launch>(self, started);
+    std::unique_ptr<Launch> launch(new Launch{self, started});
     if (const int code = pthread_create(&self->thread_, &attributes.attributes, &launched, launch.get()))
         FN_THROW(FNESysError, createFailure(code));
     launch.release();
