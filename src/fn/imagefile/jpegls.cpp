@@ -90,8 +90,7 @@ template <class Gray, class Color> FNImageReference toReference(const Samples& s
 
 FNImageReference decode(const FNRMem<unsigned char>& file, const ReadImagePropertiesFeedback& feedback,
                         const ImageLimits& limits) {
-    charls::jpegls_decoder decoder(file.data(), file.size());
-    decoder.read_header();
+    const charls::jpegls_decoder decoder(file.data(), file.size(), true);
     Samples samples{decoder.frame_info(), decoder.interleave_mode() == charls::interleave_mode::none, {}};
     const int bits = samples.frame.bits_per_sample, components = samples.frame.component_count;
     if (bits < 1 || bits > 16)
@@ -144,8 +143,7 @@ bool checkIfIsJpegLS(std::istream& stream) {
     if (!stream) FN_THROW(FNEBadFormat, "checkIfIsJpegLS(): can not read from stream");
     const std::string bytes = peekBytes(stream, headerBytes, "checkIfIsJpegLS()");
     try {
-        charls::jpegls_decoder decoder(bytes.data(), bytes.size());
-        decoder.read_header();
+        const charls::jpegls_decoder decoder(bytes.data(), bytes.size(), true);
         return true;
     } catch (const charls::jpegls_error&) {
         return false;
