@@ -88,6 +88,42 @@ template <class Gray, class Color> FNImageReference toReference(const Samples& s
     return FNImageReferenceFactory::create(image);
 }
 
+/// Where the coded data of each scan ends: at its next marker, or at the end of the file.
+std::vector<std::size_t> scanEnds(const FNRMem<unsigned char>& file) {
+    constexpr std::size_t mostScans = 4;
+    constexpr unsigned char scanMarker = 0xDA, restartMarker = 0xD0;
+    const unsigned char* const bytes = file.data();
+    std::vector<std::size_t> ends;
+    for (std::size_t at = 2; at + 4 <= file.size() && bytes[at] == 0xFF && ends.size() < mostScans;) {
+        const unsigned char marker = bytes[at + 1];
+        at += 2 + (std::size_t{bytes[at + 2]} << 8 | bytes[at + 3]);
+        if (marker != scanMarker) continue;
+        while (at + 1 < file.size() && (bytes[at] != 0xFF || bytes[at + 1] < 0x80)) ++at;
+        if (at + 1 < file.size() && (bytes[at + 1] & 0xF8) == restartMarker)
+            FN_THROW(FNEBadFormat, "readJpegLS(): Parameter value not supported");
+        ends.push_back(std::min<std::size_t>(at, file.size()));
+    }
+    return ends;
+}
+
+/// CharLS 2.4 counts zero bits behind the end of a scan for seconds if a code is cut off there. With zeros
+/// before the end it stops at them, so that a scan is tried in this way first. A whole one then seems to be
+/// too long.
+/// @throws charls::jpegls_error for a cut one
+void refuseCutScans(const FNRMem<unsigned char>& file, std::vector<unsigned char>& samples) {
+    constexpr std::size_t zeros = 32;
+    for (const std::size_t end : scanEnds(file)) {
+        std::vector<unsigned char> padded(file.begin(), file.begin() + end);
+        padded.resize(end + zeros);
+        padded.insert(padded.end(), file.begin() + end, file.end());
+        try {
+            charls::jpegls_decoder(padded, true).decode(samples);
+        } catch (const charls::jpegls_error& error) {
+            if (error.code() != charls::jpegls_errc::too_much_encoded_data) throw;
+        }
+    }
+}
+
 FNImageReference decode(const FNRMem<unsigned char>& file, const ReadImagePropertiesFeedback& feedback,
                         const ImageLimits& limits) {
     const charls::jpegls_decoder decoder(file.data(), file.size(), true);
@@ -106,6 +142,7 @@ FNImageReference decode(const FNRMem<unsigned char>& file, const ReadImageProper
     limits.check(samples.frame.width, samples.frame.height,
                  static_cast<unsigned>(components) * sampleSize + resultSize, "readJpegLS()");
     samples.bytes.resize(decoder.destination_size());
+    refuseCutScans(file, samples.bytes);
     decoder.decode(samples.bytes);
     return bits > 8 ? toReference<unsigned short, Rgb48>(samples)
                     : toReference<unsigned char, Bgra32>(samples);
