@@ -35,6 +35,8 @@ template <std::integral T, class Operation> T wrapping(T a, T b, Operation opera
 template <class T, class Operation> T combine(T a, T b, Operation operation) {
     if constexpr (std::integral<T>)
         return wrapping(a, b, operation);
+    else if constexpr (std::is_same_v<T, FNGridPos>)
+        return {wrapping(a.x, b.x, operation), wrapping(a.y, b.y, operation)};
     else
         return operation(a, b);
 }
@@ -75,10 +77,25 @@ template <class T> void scaleAll(T* a, T factor, std::size_t n) {
             a[i] = combine(a[i], factor, [](auto x, auto y) { return x * y; });
 }
 
-template <class T> FNComplex<T> quotient(FNComplex<T> a, FNComplex<T> b) {
-    const T square = norm(b);
-    const FNComplex<T> product = a * conj(b);
-    return {product.re / square, product.im / square};
+template <class T> T quotient(T a, T b) {
+    if constexpr (isComplex<T>) {
+        const T product = a * conj(b);
+        return {product.re / norm(b), product.im / norm(b)};
+    } else if constexpr (std::is_same_v<T, FNGridPos>) {
+        return {quotient(a.x, b.x), quotient(a.y, b.y)};
+    } else if (std::is_signed_v<T> && b == static_cast<T>(-1)) {
+        return combine(T{}, a, [](auto x, auto y) { return x - y; }); // the lowest integer has no quotient
+    } else {
+        return static_cast<T>(a / b);
+    }
+}
+
+/// Whether a division by b is one by 0.
+template <class T> bool isZeroDivisor(T b) {
+    if constexpr (std::is_same_v<T, FNGridPos>)
+        return b.x == 0 || b.y == 0;
+    else
+        return b == T{};
 }
 
 /// The text for a scalar product of vectors of different size.
@@ -157,21 +174,12 @@ template <class T> Vector<T>& Vector<T>::operator*=(T factor) {
 }
 
 template <class T> Vector<T>& Vector<T>::operator/=(T divisor) {
-    if (divisor == T{}) FN_THROW(FNEBadArg, "Vector<>: Vector<T>::operator/=(): Dividing by 0");
-    if constexpr (std::floating_point<T>) {
-        scaleAll(getExclusive(), T{1} / divisor, size());
-    } else {
-        T* const own = getExclusive();
-        for (std::size_t i = 0; i < size(); ++i) {
-            if constexpr (isComplex<T>)
-                own[i] = quotient(own[i], divisor);
-            else if (std::is_signed_v<T> &&
-                     divisor == static_cast<T>(-1)) // the lowest integer has no quotient
-                own[i] = combine(T{}, own[i], [](auto x, auto y) { return x - y; });
-            else
-                own[i] = static_cast<T>(own[i] / divisor);
-        }
-    }
+    if (isZeroDivisor(divisor)) FN_THROW(FNEBadArg, "Vector<>: Vector<T>::operator/=(): Dividing by 0");
+    T* const own = getExclusive();
+    if constexpr (std::floating_point<T>)
+        scaleAll(own, T{1} / divisor, size());
+    else
+        for (std::size_t i = 0; i < size(); ++i) own[i] = quotient(own[i], divisor);
     return *this;
 }
 
@@ -189,7 +197,7 @@ template <class T> typename ScalarProduct<T>::Type Vector<T>::operator*(const Ve
     } else if constexpr (std::is_same_v<T, short>) {
         return Numeric::dot(a, b, size());
     } else {
-        typename ScalarProduct<T>::Type result = 0;
+        typename ScalarProduct<T>::Type result{};
         for (std::size_t i = 0; i < size(); ++i)
             result += combine(a[i], b[i], [](auto x, auto y) { return x * y; });
         return result;
@@ -290,5 +298,6 @@ template class Vector<float>;
 template class Vector<double>;
 template class Vector<FNComplex<float>>;
 template class Vector<FNComplex<double>>;
+template class Vector<FNGridPos>;
 
 } // namespace VectorImplementations::IPP

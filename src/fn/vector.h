@@ -1,5 +1,6 @@
 #pragma once
 
+#include "fn/geometry.h"
 #include "fn/package.h"
 #include "fn/rmem.h"
 
@@ -28,8 +29,9 @@ template <class T> struct ScalarProduct { using Type = T; };
 template <> struct ScalarProduct<short> { using Type = std::int64_t; }; ///< exact
 template <> struct ScalarProduct<int> { using Type = std::int64_t; };   ///< each product in 32 bits
 
-/// Elements are of type short, int, unsigned int, unsigned long, float, double, FNComplex<float> or
-/// FNComplex<double>. All size mismatches throw FNEBadArg.
+/// Elements are of type short, int, unsigned int, unsigned long, float, double, FNComplex<float>,
+/// FNComplex<double> or FNGridPos, for which all operations run by coordinate. All size mismatches throw
+/// FNEBadArg.
 template <class T> class Vector {
 public:
     using value_type = T;
@@ -111,6 +113,7 @@ extern template class Vector<float>;
 extern template class Vector<double>;
 extern template class Vector<FNComplex<float>>;
 extern template class Vector<FNComplex<double>>;
+extern template class Vector<FNGridPos>;
 
 } // namespace VectorImplementations::IPP
 

@@ -2,6 +2,7 @@
 
 #include "fn/byte_order.h"
 #include "fn/complex.h"
+#include "fn/geometry.h"
 
 #include <cstddef>
 #include <cstdint>
@@ -25,6 +26,8 @@ template <class T> void storeElements(const T* values, unsigned char* stored, st
         htonf(&values->re, stored, 2 * n);
     else if constexpr (std::is_same_v<T, FNComplex<double>>)
         htond(&values->re, stored, 2 * n);
+    else if constexpr (std::is_same_v<T, FNGridPos>)
+        storeElements(&values->x, stored, 2 * n);
     else
         for (std::size_t i = 0; i < n; ++i, stored += sizeof(T)) {
             if constexpr (sizeof(T) == 1) {
@@ -50,6 +53,8 @@ template <class T> void loadElements(const unsigned char* stored, T* values, std
         ntohf(stored, &values->re, 2 * n);
     else if constexpr (std::is_same_v<T, FNComplex<double>>)
         ntohd(stored, &values->re, 2 * n);
+    else if constexpr (std::is_same_v<T, FNGridPos>)
+        loadElements(stored, &values->x, 2 * n);
     else
         for (std::size_t i = 0; i < n; ++i, stored += sizeof(T)) {
             if constexpr (sizeof(T) == 1)

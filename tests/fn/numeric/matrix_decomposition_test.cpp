@@ -1,7 +1,9 @@
 #include "fn/matrix_decomposition.h"
 #include "fn/matrix_eigen.h"
 
-#include "fn/numeric/thrown_text.h"
+#include "support/thrown_text.h"
+
+#include <gtest/gtest.h>
 
 #include <cmath>
 #include <random>

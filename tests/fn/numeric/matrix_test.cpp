@@ -3,7 +3,9 @@
 #include "fn/matrix_product.h"
 #include "fn/matrix_symmetric.h"
 
-#include "fn/numeric/thrown_text.h"
+#include "support/thrown_text.h"
+
+#include <gtest/gtest.h>
 
 #include <limits>
 #include <random>

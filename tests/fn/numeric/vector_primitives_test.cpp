@@ -1,6 +1,6 @@
 #include "fn/numeric/vector_primitives.h"
 
-#include "fn/numeric/each_target.h"
+#include "support/each_target.h"
 
 #include <cmath>
 #include <limits>

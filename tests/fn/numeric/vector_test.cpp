@@ -1,6 +1,8 @@
 #include "fn/vector.h"
 
-#include "fn/numeric/thrown_text.h"
+#include "support/thrown_text.h"
+
+#include <gtest/gtest.h>
 
 #include <cmath>
 #include <limits>
@@ -13,7 +15,7 @@ template <class T> FNVector<T> vectorOf(const std::vector<T>& values) {
 
 template <class V> class VectorOfAnyElement : public testing::Test {};
 using Elements = testing::Types<short, int, unsigned int, unsigned long, float, double, FNComplex<float>,
-                                FNComplex<double>>;
+                                FNComplex<double>, FNGridPos>;
 TYPED_TEST_SUITE(VectorOfAnyElement, Elements);
 
 template <class T> FNVector<T> counting(std::size_t n) {
@@ -21,6 +23,8 @@ template <class T> FNVector<T> counting(std::size_t n) {
     for (std::size_t i = 0; i < n; ++i) {
         if constexpr (requires(T t) { t.re; })
             result[i] = T{static_cast<decltype(T::re)>(i), static_cast<decltype(T::re)>(1)};
+        else if constexpr (std::is_same_v<T, FNGridPos>)
+            result[i] = FNGridPos(static_cast<int>(i), -1);
         else
             result[i] = static_cast<T>(i);
     }
