@@ -27,22 +27,23 @@ function(orbek_subsystem folder)
         COMMENT "Checking what ${folder} includes"
         VERBATIM)
 
-    add_library(${target} OBJECT ${sources} ${stamp})
-    target_include_directories(${target} PUBLIC ${CMAKE_SOURCE_DIR}/src)
-    target_link_libraries(${target} PUBLIC ${arg_LIBRARIES})
-
-    # The objects of a used object library do not travel along; whoever links asks for the whole set.
+    # Neither the objects nor the libraries of a used object library travel along; each target names the whole set.
     set(closure ${target})
+    set(libraries ${arg_LIBRARIES})
     foreach(used IN LISTS arg_USES)
         string(REPLACE "/" "_" used_target "orbek_${used}")
         get_target_property(below ${used_target} ORBEK_CLOSURE)
+        get_target_property(libraries_below ${used_target} ORBEK_LIBRARIES)
         list(APPEND closure ${below})
-        foreach(library IN LISTS below)
-            target_link_libraries(${target} PUBLIC $<TARGET_PROPERTY:${library},INTERFACE_LINK_LIBRARIES>)
-        endforeach()
+        list(APPEND libraries ${libraries_below})
     endforeach()
     list(REMOVE_DUPLICATES closure)
-    set_target_properties(${target} PROPERTIES ORBEK_CLOSURE "${closure}")
+    list(REMOVE_DUPLICATES libraries)
+
+    add_library(${target} OBJECT ${sources} ${stamp})
+    target_include_directories(${target} PUBLIC ${CMAKE_SOURCE_DIR}/src)
+    target_link_libraries(${target} PUBLIC ${libraries})
+    set_target_properties(${target} PROPERTIES ORBEK_CLOSURE "${closure}" ORBEK_LIBRARIES "${libraries}")
 endfunction()
 
 # orbek_link(<target> <folder>): links the objects of a subsystem and of all that it uses.

@@ -7,8 +7,7 @@
 
 namespace {
 
-template <class Read>
-bool accepts(Read read) {
+template <class Read> bool accepts(Read read) {
     try {
         read();
         return true;
@@ -31,7 +30,8 @@ extern "C" int LLVMFuzzerTestOneInput(const unsigned char* data, std::size_t siz
 
     std::string written(fromMemory.size(), '\0');
     fromMemory.write(reinterpret_cast<unsigned char*>(written.data()));
-    if (written.compare(0, written.size(), reinterpret_cast<const char*>(data), written.size()) != 0) std::abort();
+    if (written.compare(0, written.size(), reinterpret_cast<const char*>(data), written.size()) != 0)
+        std::abort();
 
     accepts([&] { Fn::deSerialize<Fn::SerializableMap<std::string, std::string>>(fromMemory); });
     accepts([&] { Fn::deSerialize<Fn::SerializableList<Fn::SerializableList<int>>>(fromMemory); });

@@ -1,5 +1,6 @@
-// Runs a fuzz target without libFuzzer: on every file of the given folders and files, and on simple mutations of each
-// (every truncation up to a limit, and single bytes changed), so that the seeds guard the parser in every test run.
+// Runs a fuzz target without libFuzzer: on every file of the given folders and files, and on simple mutations
+// of each (every truncation up to a limit, and single bytes changed), so that the seeds guard the parser in
+// every test run.
 
 #include <algorithm>
 #include <cstdio>
@@ -31,7 +32,8 @@ void runWithMutations(const std::filesystem::path& path) {
     for (std::size_t i = 0; i < mutations; ++i) {
         std::string changed = bytes;
         for (unsigned n = random() % 3 + 1; n > 0; --n)
-            changed[random() % changed.size()] = static_cast<char>(random() % 2 ? random() : 0xFF * (random() % 2));
+            changed[random() % changed.size()] =
+                static_cast<char>(random() % 2 ? random() : 0xFF * (random() % 2));
         run(changed);
     }
 }

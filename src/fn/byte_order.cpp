@@ -42,7 +42,8 @@ std::uint64_t loadUInt64(const unsigned char* stored) noexcept {
 } // namespace Fn
 
 void htonf(const float* values, unsigned char* stored, std::size_t n) noexcept {
-    for (std::size_t i = 0; i < n; ++i) Fn::storeUInt32(std::bit_cast<std::uint32_t>(values[i]), stored + 4 * i);
+    for (std::size_t i = 0; i < n; ++i)
+        Fn::storeUInt32(std::bit_cast<std::uint32_t>(values[i]), stored + 4 * i);
 }
 
 void ntohf(const unsigned char* stored, float* values, std::size_t n) noexcept {
@@ -50,7 +51,8 @@ void ntohf(const unsigned char* stored, float* values, std::size_t n) noexcept {
 }
 
 void htond(const double* values, unsigned char* stored, std::size_t n) noexcept {
-    for (std::size_t i = 0; i < n; ++i) Fn::storeUInt64(std::bit_cast<std::uint64_t>(values[i]), stored + 8 * i);
+    for (std::size_t i = 0; i < n; ++i)
+        Fn::storeUInt64(std::bit_cast<std::uint64_t>(values[i]), stored + 8 * i);
 }
 
 void ntohd(const unsigned char* stored, double* values, std::size_t n) noexcept {

@@ -5,8 +5,8 @@
 
 /// The stored form of numbers: the same on every processor.
 ///
-/// 32-bit integers and floats are stored most significant byte first. 64-bit integers and doubles are two such 32-bit
-/// words, the less significant word first: 0x0102030405060708 is 05 06 07 08 01 02 03 04.
+/// 32-bit integers and floats are stored most significant byte first. 64-bit integers and doubles are two
+/// such 32-bit words, the less significant word first: 0x0102030405060708 is 05 06 07 08 01 02 03 04.
 
 namespace Fn {
 

@@ -3,8 +3,8 @@
 #include <cstddef>
 #include <memory>
 
-/// Collects small pieces of output, so that the many cores of a typical record do not cost a system call each. Pieces
-/// above a size are passed on as they are.
+/// Collects small pieces of output, so that the many cores of a typical record do not cost a system call
+/// each. Pieces above a size are passed on as they are.
 class FNCollectBuffer {
 public:
     /// Where the bytes go.

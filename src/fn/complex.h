@@ -1,8 +1,8 @@
 #pragma once
 
-/// A complex number of any scalar, the integers of the fixed-point transforms included. Real part first in memory.
-template <class T>
-struct FNComplex {
+/// A complex number of any scalar, the integers of the fixed-point transforms included. Real part first in
+/// memory.
+template <class T> struct FNComplex {
     T re{};
     T im{};
 
@@ -15,13 +15,11 @@ struct FNComplex {
     friend constexpr bool operator==(FNComplex, FNComplex) = default;
 };
 
-template <class T>
-constexpr FNComplex<T> conj(FNComplex<T> z) {
+template <class T> constexpr FNComplex<T> conj(FNComplex<T> z) {
     return {z.re, -z.im};
 }
 
 /// Squared magnitude.
-template <class T>
-constexpr T norm(FNComplex<T> z) {
+template <class T> constexpr T norm(FNComplex<T> z) {
     return z.re * z.re + z.im * z.im;
 }

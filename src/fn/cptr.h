@@ -10,13 +10,13 @@
 
 /// Counted handles: how anything with shared ownership is held.
 ///
-/// Copying a handle shares the pointee; the last handle deletes it. Counts are safe for any number of threads, a single
-/// handle object is not: two threads each use a handle of their own.
+/// Copying a handle shares the pointee; the last handle deletes it. Counts are safe for any number of
+/// threads, a single handle object is not: two threads each use a handle of their own.
 
 namespace Fn::CptrImpl {
 
-/// The count that all handles of one pointee share. Each record has a plain mutex of its own, and every change of the
-/// count takes it. The creator stores the first count.
+/// The count that all handles of one pointee share. Each record has a plain mutex of its own, and every
+/// change of the count takes it. The creator stores the first count.
 class Ref {
 public:
     /// @throws FNESysError if the mutex cannot be made.
@@ -28,8 +28,8 @@ public:
     void increment() noexcept { add(1); }
     /// @return the count after the decrement.
     std::int32_t decrement() noexcept { return add(-1); }
-    /// The count at this moment, read without the mutex. If it is 1, all that former owners did to the pointee
-    /// happened before.
+    /// The count at this moment, read without the mutex. If it is 1, all that former owners did to the
+    /// pointee happened before.
     std::int32_t count() const noexcept {
         return std::atomic_ref(const_cast<std::int32_t&>(count_)).load(std::memory_order_acquire);
     }
@@ -49,10 +49,9 @@ private:
 
 } // namespace Fn::CptrImpl
 
-/// Counted handle of a `T`, which is destroyed by `delete` of a `T*`: a `T` that is used through a base class needs a
-/// virtual destructor. A handle owns a count record also when its pointer is null.
-template <class T>
-class FNCountedPtr {
+/// Counted handle of a `T`, which is destroyed by `delete` of a `T*`: a `T` that is used through a base class
+/// needs a virtual destructor. A handle owns a count record also when its pointer is null.
+template <class T> class FNCountedPtr {
 public:
     FNCountedPtr() : FNCountedPtr(nullptr) {}
 
@@ -68,10 +67,8 @@ public:
 
     /// Shares the pointee of a handle of a derived class.
     template <class U>
-        requires std::convertible_to<U*, T*>
-    FNCountedPtr(const FNCountedPtr<U>& other) noexcept : pointee_(other.pointee_), ref_(other.ref_) {
-        ref_->increment();
-    }
+    requires std::convertible_to<U*, T*> FNCountedPtr(const FNCountedPtr<U>& other)
+    noexcept : pointee_(other.pointee_), ref_(other.ref_) { ref_->increment(); }
 
     ~FNCountedPtr() { smartDecr(); }
 
@@ -98,22 +95,19 @@ public:
     std::int32_t count() const noexcept { return ref_->count(); }
 
     /// Handles compare by pointer.
-    template <class U>
-    bool operator==(const FNCountedPtr<U>& other) const noexcept {
+    template <class U> bool operator==(const FNCountedPtr<U>& other) const noexcept {
         return pointee_ == other.get();
     }
 
     /// The same pointee seen as a derived class, a null handle if it is none.
-    template <class U>
-    FNCountedPtr<U> dynamicCast() const {
+    template <class U> FNCountedPtr<U> dynamicCast() const {
         U* const derived = dynamic_cast<U*>(pointee_);
         return derived ? FNCountedPtr<U>(derived, ref_) : FNCountedPtr<U>();
     }
 
 private:
     using Ref = Fn::CptrImpl::Ref;
-    template <class>
-    friend class FNCountedPtr;
+    template <class> friend class FNCountedPtr;
 
     FNCountedPtr(T* pointee, Ref* ref) noexcept : pointee_(pointee), ref_(ref) { ref_->increment(); }
 

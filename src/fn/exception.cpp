@@ -27,7 +27,8 @@ const char* FNException::what() const noexcept {
 
 void FNException::print(std::ostream& stream) const noexcept {
     try {
-        // Inserting a null C string sets the stream's bad bit; the insertions that follow are then without effect.
+        // Inserting a null C string sets the stream's bad bit; the insertions that follow are then without
+        // effect.
         stream << "Exception[" << typeId_ << "]: " << what() << " in " << file() << " line " << line_;
     } catch (...) {
         // The stream was told to throw on failure. Its state tells the same, and printing must not throw.

@@ -6,8 +6,8 @@
 
 /// The exception family: the only way in which a failure is reported inside the library.
 ///
-/// Each exception carries a text, the name of the throwing source file without its directory, a line, and the name of
-/// its concrete class. Throw with FN_THROW, which fills in file and line:
+/// Each exception carries a text, the name of the throwing source file without its directory, a line, and the
+/// name of its concrete class. Throw with FN_THROW, which fills in file and line:
 ///
 ///     if (index >= size) FN_THROW(FNEOutOfRange, "index " + std::to_string(index) + " is beyond the end");
 
@@ -33,7 +33,8 @@ public:
     /// Name of the concrete class, null only if the thrower passed null.
     const char* typeId() const noexcept { return typeId_; }
 
-    /// Replaces file, line and text; `file` is kept as a pointer and must outlive the exception and its copies.
+    /// Replaces file, line and text; `file` is kept as a pointer and must outlive the exception and its
+    /// copies.
     void init_msg(const char* file, int line, const char* message) noexcept;
 
 protected:
@@ -132,13 +133,11 @@ public:
 namespace Fn {
 
 /// Throws an `E` with its own type id. Called through FN_THROW.
-template <class E>
-[[noreturn]] void raise(const char* message, const char* file, int line) {
+template <class E> [[noreturn]] void raise(const char* message, const char* file, int line) {
     throw E(message, file, line, E::thisTypeId);
 }
 
-template <class E>
-[[noreturn]] void raise(const std::string& message, const char* file, int line) {
+template <class E> [[noreturn]] void raise(const std::string& message, const char* file, int line) {
     throw E(message.c_str(), file, line, E::thisTypeId);
 }
 

@@ -17,8 +17,8 @@ private:
     std::string message_;
 };
 
-/// Exceptions keep their file as a pointer, so the names of files on the other side live here to the end of the process.
-/// A peer that invents names without end gets null (printed as "nofile") once the table is full.
+/// Exceptions keep their file as a pointer, so the names of files on the other side live here to the end of
+/// the process. A peer that invents names without end gets null (printed as "nofile") once the table is full.
 const char* lastingFileName(const std::string& file) {
     constexpr std::size_t mostNames = 4096;
     constexpr std::size_t longestName = 255;
@@ -31,17 +31,17 @@ const char* lastingFileName(const std::string& file) {
     return names.size() < mostNames ? names.insert(file).first->c_str() : nullptr;
 }
 
-template <class E>
-std::pair<std::string, void (*)(const char*, const char*, int)> thrower() {
-    return {E::thisTypeId, [](const char* message, const char* file, int line) { raise<E>(message, file, line); }};
+template <class E> std::pair<std::string, void (*)(const char*, const char*, int)> thrower() {
+    return {E::thisTypeId,
+            [](const char* message, const char* file, int line) { raise<E>(message, file, line); }};
 }
 
 } // namespace
 
 ExceptionFactory::ExceptionFactory()
-    : throwers_{thrower<FNEIOError>(),    thrower<FNEBadFormat>(), thrower<FNESysError>(),
-                thrower<FNETimeOut>(),    thrower<FNEGeneric>(),   thrower<FNEOutOfRange>(),
-                thrower<FNEBadArg>(),     thrower<FNEBadFunCall>()} {}
+    : throwers_{thrower<FNEIOError>(), thrower<FNEBadFormat>(), thrower<FNESysError>(),
+                thrower<FNETimeOut>(), thrower<FNEGeneric>(),   thrower<FNEOutOfRange>(),
+                thrower<FNEBadArg>(),  thrower<FNEBadFunCall>()} {}
 
 Package ExceptionFactory::serialize(const std::string& message, const std::string& type,
                                     const std::string& file, int line) const {

@@ -12,7 +12,8 @@ class ExceptionFactory {
 public:
     ExceptionFactory();
 
-    /// A list of the message; then of `type` if it is not empty; then of `file` and `line` if neither text is empty.
+    /// A list of the message; then of `type` if it is not empty; then of `file` and `line` if neither text is
+    /// empty.
     Package serialize(const std::string& message, const std::string& type, const std::string& file,
                       int line) const;
     Package serialize(const FNException& exception) const;

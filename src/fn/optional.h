@@ -5,8 +5,7 @@
 namespace Fn {
 
 /// A value that may be absent. Copies share the value.
-template <class T>
-class Optional {
+template <class T> class Optional {
 public:
     Optional() = default;
     Optional(const T& value) : value_(new T(value)) {}

@@ -19,12 +19,11 @@ constexpr std::size_t countSize = 4;
 /// Largest sum of sizes of consecutive cores that are read at once.
 constexpr std::uint64_t longestRun = 8192;
 
-/// What a count announces is allocated in steps that start at this size and double, so that a false count costs no
-/// more memory than the data that really comes.
+/// What a count announces is allocated in steps that start at this size and double, so that a false count
+/// costs no more memory than the data that really comes.
 constexpr std::uint64_t firstStep = 1 << 20;
 
-template <class Value, class Store>
-Core scalarCoreOf(Value value, std::size_t size, Store store) {
+template <class Value, class Store> Core scalarCoreOf(Value value, std::size_t size, Store store) {
     Core core(size);
     store(value, core.getExclusive());
     return core;
@@ -129,7 +128,8 @@ std::list<Core> readCores(Source& source) {
             cores.push_back(run);
         } else {
             const unsigned char* data = run.data();
-            for (std::size_t i = first; i < end; data += sizes[i++]) cores.push_back(copiedCore(data, sizes[i]));
+            for (std::size_t i = first; i < end; data += sizes[i++])
+                cores.push_back(copiedCore(data, sizes[i]));
         }
         first = end;
     }
@@ -259,12 +259,24 @@ const unsigned char* Package::scalarCore(std::size_t size, const char* name) con
     return cores_.front().data();
 }
 
-int Package::toInt32() const { return static_cast<int>(loadUInt32(scalarCore(4, "FNInt32"))); }
-unsigned int Package::toUInt32() const { return loadUInt32(scalarCore(4, "FNUInt32")); }
-long Package::toInt64() const { return static_cast<long>(loadUInt64(scalarCore(8, "FNInt64"))); }
-unsigned long Package::toUInt64() const { return loadUInt64(scalarCore(8, "FNUInt64")); }
-float Package::toFloat() const { return std::bit_cast<float>(loadUInt32(scalarCore(4, "float"))); }
-double Package::toDouble() const { return std::bit_cast<double>(loadUInt64(scalarCore(8, "double"))); }
+int Package::toInt32() const {
+    return static_cast<int>(loadUInt32(scalarCore(4, "FNInt32")));
+}
+unsigned int Package::toUInt32() const {
+    return loadUInt32(scalarCore(4, "FNUInt32"));
+}
+long Package::toInt64() const {
+    return static_cast<long>(loadUInt64(scalarCore(8, "FNInt64")));
+}
+unsigned long Package::toUInt64() const {
+    return loadUInt64(scalarCore(8, "FNUInt64"));
+}
+float Package::toFloat() const {
+    return std::bit_cast<float>(loadUInt32(scalarCore(4, "float")));
+}
+double Package::toDouble() const {
+    return std::bit_cast<double>(loadUInt64(scalarCore(8, "double")));
+}
 
 bool Package::toBool() const {
     if (*this == Package(true)) return true;

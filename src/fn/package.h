@@ -8,10 +8,10 @@
 
 /// The one serialized form of the system: a list of byte blocks, its cores.
 ///
-/// A package has no type tags and no version marks; its reader knows what it reads. Nested structures are flattened
-/// into one list of cores with counts in cores of their own. The bytes of a package, in memory, in a file, on a stream
-/// and on a connection alike, are: the number of cores, the size of each core, and the bytes of the cores with no
-/// padding. Counts are unsigned, 4 bytes, most significant first.
+/// A package has no type tags and no version marks; its reader knows what it reads. Nested structures are
+/// flattened into one list of cores with counts in cores of their own. The bytes of a package, in memory, in
+/// a file, on a stream and on a connection alike, are: the number of cores, the size of each core, and the
+/// bytes of the cores with no padding. Counts are unsigned, 4 bytes, most significant first.
 ///
 ///     Fn::Package record(std::list<Fn::Package>{Fn::Package(7), Fn::serialize<std::string>("bob")});
 ///     record.write(stream);
@@ -43,8 +43,8 @@ public:
     /// Parses the bytes of a package, and copies; bytes behind the last core are ignored.
     /// @throws FNEBadArg if `size` bytes do not hold what the counts announce.
     Package(const unsigned char* data, unsigned long size);
-    /// Reads from the present position and stops behind the last core. Memory grows with what has arrived, not with
-    /// what the counts announce. @throws FNEIOError
+    /// Reads from the present position and stops behind the last core. Memory grows with what has arrived,
+    /// not with what the counts announce. @throws FNEIOError
     explicit Package(std::istream& stream);
     explicit Package(std::FILE* file);
 

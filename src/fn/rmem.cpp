@@ -39,8 +39,10 @@ void* allocatePlain(std::uint64_t size) {
 
 void* allocateAligned(std::uint64_t size, std::uint32_t alignment) {
     const std::uint64_t boundary = std::bit_ceil(std::uint64_t{alignment});
-    const std::uint64_t padded = (size + boundary - 1) / boundary * boundary; // aligned_alloc wants a multiple
-    void* const memory = padded < size ? nullptr : std::aligned_alloc(boundary, padded);
+    const std::uint64_t padded =
+        (size + boundary - 1) / boundary * boundary; // aligned_alloc wants a multiple
+    const bool possible = size <= static_cast<std::uint64_t>(std::numeric_limits<std::ptrdiff_t>::max());
+    void* const memory = possible ? std::aligned_alloc(boundary, padded) : nullptr;
     if (!memory)
         FN_THROW(FNESysError,
                  "There was insufficient memory to fulfill the allocation request (mkl_malloc).");
@@ -82,8 +84,8 @@ FNRMemCore::FNRMemCore(void* memory, std::uint64_t size, const FNCountedPtr<Dtor
 
 FNRMemCore::FNRMemCore(const void* memory, std::uint64_t size, const FNCountedPtr<Dtor>& dtor, bool noCopy) {
     if (!memory) FN_THROW(FNEBadArg, "FNRMemCore::ctor: Zero Pointer passed");
-    body_ = FNCountedPtr<FNRMemCoreBody>(
-        new FNRMemCoreBody(const_cast<void*>(memory), size, dtor, true, noCopy));
+    body_ =
+        FNCountedPtr<FNRMemCoreBody>(new FNRMemCoreBody(const_cast<void*>(memory), size, dtor, true, noCopy));
 }
 
 bool FNRMemCore::operator==(const FNRMemCore& other) const noexcept {

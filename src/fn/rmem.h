@@ -13,14 +13,14 @@
 
 /// Copy-on-write memory: how pixels, vectors, matrices and serialized bytes are stored.
 ///
-/// An FNRMem<T> is a view of `size()` elements on a counted block. Copies and sub-views share the block, and a writer
-/// calls getExclusive() first, which copies the view's elements if anyone else could see the change:
+/// An FNRMem<T> is a view of `size()` elements on a counted block. Copies and sub-views share the block, and
+/// a writer calls getExclusive() first, which copies the view's elements if anyone else could see the change:
 ///
 ///     FNRMem<float> a(1000), b = a;          // one block
 ///     float* p = b.getExclusive();           // b has a block of its own from here on
 ///
-/// Two threads never use the same view object, and a block that one thread may write is not handed to another at the
-/// same moment. Reading through copies on several threads needs no lock.
+/// Two threads never use the same view object, and a block that one thread may write is not handed to another
+/// at the same moment. Reading through copies on several threads needs no lock.
 
 /// The storage of a block.
 class FNRMemCoreBody {
@@ -46,7 +46,8 @@ public:
     /// @throws FNEBadArg for alignment 0 with a size above 0; FNESysError if there is no memory.
     FNRMemCoreBody(std::uint64_t size, std::uint32_t alignment);
     /// Wraps `data`, which `dtor` frees.
-    FNRMemCoreBody(void* data, std::uint64_t size, const FNCountedPtr<Dtor>& dtor, bool constant, bool noCopy);
+    FNRMemCoreBody(void* data, std::uint64_t size, const FNCountedPtr<Dtor>& dtor, bool constant,
+                   bool noCopy);
     ~FNRMemCoreBody() { dtor_->del(data_); }
     FNRMemCoreBody(const FNRMemCoreBody&) = delete;
     FNRMemCoreBody& operator=(const FNRMemCoreBody&) = delete;
@@ -87,8 +88,8 @@ public:
     /// Equal if the bodies are the same one, or if their sizes are equal and not 0 and all bytes are equal.
     bool operator==(const FNRMemCore& other) const noexcept;
 
-    /// Prepares `size` bytes from `offset` for writing in place: copies them to a body of their own if the body is
-    /// shared or constant, and moves them there too if they are a small part of a large block.
+    /// Prepares `size` bytes from `offset` for writing in place: copies them to a body of their own if the
+    /// body is shared or constant, and moves them there too if they are a small part of a large block.
     /// @return the offset of the bytes from now on.
     /// @throws FNEBadArg for a range in an empty block; FNESysError for no-copy memory.
     std::uint64_t demandExclusiveUse(std::uint64_t offset, std::uint64_t size);
@@ -101,7 +102,8 @@ private:
     FNCountedPtr<FNRMemCoreBody> body_;
 };
 
-/// Alignment in bytes of a fresh block of `T`, 0 for plain allocation: numbers are laid out for the vector units.
+/// Alignment in bytes of a fresh block of `T`, 0 for plain allocation: numbers are laid out for the vector
+/// units.
 template <class T>
 inline constexpr std::uint32_t FNRMemAlignment =
     std::is_same_v<T, float> || std::is_same_v<T, double> || std::is_same_v<T, FNComplex<float>> ||
@@ -110,8 +112,7 @@ inline constexpr std::uint32_t FNRMemAlignment =
         : 0;
 
 /// View of `size()` elements of `T`, from a byte offset, on a counted block.
-template <class T>
-class FNRMem {
+template <class T> class FNRMem {
     static_assert(std::is_trivially_copyable_v<T>, "blocks are copied byte by byte");
 
 public:
@@ -168,7 +169,8 @@ public:
     const T* end() const noexcept { return data() + size_; }
     std::span<const T> span() const noexcept { return {data(), size_}; }
 
-    /// First element, for writing: what others see does not change. The pointer holds until the view is copied.
+    /// First element, for writing: what others see does not change. The pointer holds until the view is
+    /// copied.
     T* getExclusive() {
         offset_ = core_.demandExclusiveUse(offset_, size_ * sizeof(T));
         return reinterpret_cast<T*>(core_.writable() + offset_);
@@ -185,8 +187,8 @@ public:
         return data()[i];
     }
 
-    /// Equal if both are the same view, or if they have the same bytes and at least one. Two empty views on different
-    /// blocks are not equal.
+    /// Equal if both are the same view, or if they have the same bytes and at least one. Two empty views on
+    /// different blocks are not equal.
     bool operator==(const FNRMem& other) const noexcept {
         if (size_ != other.size_) return false;
         if (core_.sharesBody(other.core_) && offset_ == other.offset_) return true;

@@ -10,34 +10,31 @@
 #include <string>
 #include <vector>
 
-/// Packing of values: `Fn::serialize<T>(value)` gives a package, `Fn::deSerialize<T>(package)` the value back.
+/// Packing of values: `Fn::serialize<T>(value)` gives a package, `Fn::deSerialize<T>(package)` the value
+/// back.
 ///
-/// A class takes part through a conversion to Package and a constructor from `const Package&`, any other type through a
-/// specialisation of Fn::Serializer.
+/// A class takes part through a conversion to Package and a constructor from `const Package&`, any other type
+/// through a specialisation of Fn::Serializer.
 
 namespace Fn {
 
 /// How values of one type are packed; the general form is for classes that do it themselves.
-template <class T>
-struct Serializer {
+template <class T> struct Serializer {
     static Package pack(const T& value) { return static_cast<Package>(value); }
     static T unpack(const Package& package) { return T(package); }
 };
 
-template <class T>
-Package serialize(const T& value) {
+template <class T> Package serialize(const T& value) {
     return Serializer<T>::pack(value);
 }
 
 /// @throws FNEBadArg if the package does not hold a `T`.
-template <class T>
-T deSerialize(const Package& package) {
+template <class T> T deSerialize(const Package& package) {
     return Serializer<T>::unpack(package);
 }
 
 /// Scalars: `toValue` is the member of Package that reads one.
-template <class T, T (Package::*toValue)() const>
-struct ScalarSerializer {
+template <class T, T (Package::*toValue)() const> struct ScalarSerializer {
     static Package pack(T value) { return Package(value); }
     static T unpack(const Package& package) { return (package.*toValue)(); }
 };
@@ -80,8 +77,7 @@ public:
     std::size_t remaining() const noexcept { return elements_.size(); }
 
     /// The next element. @throws FNEBadArg if there is none or it is not a `T`.
-    template <class T>
-    T next() {
+    template <class T> T next() {
         const Package element = take();
         return deSerialize<T>(element);
     }
@@ -95,8 +91,7 @@ private:
     std::list<Package> elements_;
 };
 
-template <class T>
-Optional<T> Serializer<Optional<T>>::unpack(const Package& package) {
+template <class T> Optional<T> Serializer<Optional<T>>::unpack(const Package& package) {
     PackageReader reader(package);
     if (reader.atEnd()) return {};
     const T value = reader.next<T>();
@@ -105,8 +100,7 @@ Optional<T> Serializer<Optional<T>>::unpack(const Package& package) {
 }
 
 /// A standard sequence or set that packs as the list of its elements in iteration order.
-template <class Container>
-class SerializableSequence : public Container {
+template <class Container> class SerializableSequence : public Container {
 public:
     using Container::Container;
     SerializableSequence() = default;
@@ -117,7 +111,8 @@ public:
     }
     explicit operator Package() const {
         std::list<Package> elements;
-        for (const auto& element : *this) elements.push_back(serialize<typename Container::value_type>(element));
+        for (const auto& element : *this)
+            elements.push_back(serialize<typename Container::value_type>(element));
         return Package(elements);
     }
 };
@@ -126,9 +121,9 @@ template <class T> using SerializableVector = SerializableSequence<std::vector<T
 template <class T, class Less = std::less<T>>
 using SerializableMultiset = SerializableSequence<std::multiset<T, Less>>;
 
-/// A standard map that packs as a list with one element for each entry in key order, itself a list of key and value.
-template <class Map>
-class SerializableAssociation : public Map {
+/// A standard map that packs as a list with one element for each entry in key order, itself a list of key and
+/// value.
+template <class Map> class SerializableAssociation : public Map {
 public:
     using Map::Map;
     SerializableAssociation() = default;
@@ -155,8 +150,7 @@ template <class K, class V> using SerializableMultiMap = SerializableAssociation
 } // namespace Fn
 
 /// Two values; packs as the list of both.
-template <class A, class B>
-struct FNPair {
+template <class A, class B> struct FNPair {
     A first{};
     B second{};
 
@@ -175,8 +169,7 @@ private:
 };
 
 /// Three values; packs as the list of them.
-template <class A, class B, class C>
-struct FNTriple {
+template <class A, class B, class C> struct FNTriple {
     A first{};
     B second{};
     C third{};
@@ -185,8 +178,8 @@ struct FNTriple {
     FNTriple(const A& a, const B& b, const C& c) : first(a), second(b), third(c) {}
     explicit FNTriple(const Fn::Package& package) : FNTriple(Fn::PackageReader(package)) {}
     explicit operator Fn::Package() const {
-        return Fn::Package(
-            std::list<Fn::Package>{Fn::serialize<A>(first), Fn::serialize<B>(second), Fn::serialize<C>(third)});
+        return Fn::Package(std::list<Fn::Package>{Fn::serialize<A>(first), Fn::serialize<B>(second),
+                                                  Fn::serialize<C>(third)});
     }
     bool operator==(const FNTriple&) const = default;
 

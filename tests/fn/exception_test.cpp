@@ -49,8 +49,7 @@ TEST(Exception, ThrowingSiteIsNamedWithoutItsFolder) {
     }
 }
 
-template <class E>
-void expectCrossing(const Fn::ExceptionFactory& factory) {
+template <class E> void expectCrossing(const Fn::ExceptionFactory& factory) {
     try {
         factory.throwException(factory.serialize(E("text", "file.cpp", 12)));
     } catch (const E& e) {

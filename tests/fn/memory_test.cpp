@@ -93,12 +93,8 @@ TEST(Memory, ASmallViewLeavesALargeBlockThatNobodyElseNeeds) {
     const struct {
         std::uint64_t block, offset, view;
         bool moves;
-    } cases[] = {{7000, 100, 2000, true},
-                 {7000, 100, 3000, false},
-                 {7000, 0, 2333, false},
-                 {7000, 0, 2332, true},
-                 {1000000, 5, 1024, false},
-                 {1000000, 5, 1025, true}};
+    } cases[] = {{7000, 100, 2000, true}, {7000, 100, 3000, false},  {7000, 0, 2333, false},
+                 {7000, 0, 2332, true},   {1000000, 5, 1024, false}, {1000000, 5, 1025, true}};
     for (const auto& c : cases) {
         FNRMem<unsigned char> view(FNRMem<unsigned char>(c.block), c.offset, c.view);
         const unsigned char* const before = view.data();

@@ -1,8 +1,10 @@
 #include "fn/byte_order.h"
 #include "fn/serialize.h"
+#include "support/thrown.h"
 
 #include <gtest/gtest.h>
 
+#include <functional>
 #include <limits>
 #include <sstream>
 
@@ -17,27 +19,17 @@ Bytes bytesOf(const Package& package) {
     return bytes;
 }
 
-Package parsed(const Bytes& bytes) { return Package(bytes.data(), bytes.size()); }
-
-template <class Call>
-std::string messageOf(Call call) {
-    try {
-        call();
-    } catch (const FNException& e) {
-        return std::string(e.typeId()) + ": " + e.what();
-    }
-    return "nothing thrown";
+Package parsed(const Bytes& bytes) {
+    return Package(bytes.data(), bytes.size());
 }
 
-template <class T>
-void expectRoundTrip(const T& value) {
+template <class T> void expectRoundTrip(const T& value) {
     EXPECT_EQ(Fn::deSerialize<T>(parsed(bytesOf(Fn::serialize<T>(value)))), value);
 }
 
 TEST(Package, ScalarsHaveTheirStoredForm) {
     EXPECT_EQ(bytesOf(Package(5)), (Bytes{0, 0, 0, 1, 0, 0, 0, 4, 0, 0, 0, 5}));
-    EXPECT_EQ(bytesOf(Package(0x0102030405060708L)),
-              (Bytes{0, 0, 0, 1, 0, 0, 0, 8, 5, 6, 7, 8, 1, 2, 3, 4}));
+    EXPECT_EQ(bytesOf(Package(0x0102030405060708L)), (Bytes{0, 0, 0, 1, 0, 0, 0, 8, 5, 6, 7, 8, 1, 2, 3, 4}));
     EXPECT_EQ(bytesOf(Package(1.0)), (Bytes{0, 0, 0, 1, 0, 0, 0, 8, 0, 0, 0, 0, 0x3F, 0xF0, 0, 0}));
     EXPECT_EQ(bytesOf(Package(1.0f)), (Bytes{0, 0, 0, 1, 0, 0, 0, 4, 0x3F, 0x80, 0, 0}));
     EXPECT_EQ(bytesOf(Package(true)), (Bytes{0, 0, 0, 1, 0, 0, 0, 5, 't', 'r', 'u', 'e', 0}));
@@ -95,14 +87,18 @@ TEST(Package, ContainersReadBack) {
 }
 
 TEST(Package, StreamsAndFilesCarryCoresOfEverySize) {
-    const std::vector<std::vector<std::uint64_t>> shapes = {
-        {}, {1}, std::vector<std::uint64_t>(1000, 12), {1 << 20}, {4096, 4097, 8192, 3, 8190, 8193},
-        {(5 << 20) + 3, 1, 7}};
+    const std::vector<std::vector<std::uint64_t>> shapes = {{},
+                                                            {1},
+                                                            std::vector<std::uint64_t>(1000, 12),
+                                                            {1 << 20},
+                                                            {4096, 4097, 8192, 3, 8190, 8193},
+                                                            {(5 << 20) + 3, 1, 7}};
     for (const auto& shape : shapes) {
         std::list<Package::Core> cores;
         for (const std::uint64_t size : shape) {
             Package::Core core(size);
-            for (std::uint64_t i = 0; i < size; ++i) core.getExclusive()[i] = static_cast<unsigned char>(i * 7 + size);
+            for (std::uint64_t i = 0; i < size; ++i)
+                core.getExclusive()[i] = static_cast<unsigned char>(i * 7 + size);
             cores.push_back(core);
         }
         const Package package(cores);
@@ -132,7 +128,7 @@ TEST(Package, TruncatedMemoryIsRefused) {
     const Bytes whole = bytesOf(Package(std::list<Package>{Package(1), Package(true)}));
     for (std::size_t size = 0; size < whole.size(); ++size) {
         const char* const step = size < 4 ? "number of cores" : size < 4 + 4 * 5 ? "sizes of cores" : "core";
-        EXPECT_EQ(messageOf([&] { Package(whole.data(), size); }),
+        EXPECT_EQ(thrownBy([&] { Package(whole.data(), size); }),
                   std::string("FNEBadArg: creating Package from memory: reading ") + step);
         std::istringstream stream(std::string(whole.begin(), whole.begin() + size));
         EXPECT_THROW(Package{stream}, FNEIOError);
@@ -172,9 +168,9 @@ TEST(Package, HugeAnnouncementsCostOnlyWhatArrives) {
                   "creating Package from memory: reading core",
                   "Package: error reading core from istream: got error reading 4294967295 bytes"}};
     for (const auto& c : cases) {
-        EXPECT_EQ(messageOf([&] { parsed(c.head); }), std::string("FNEBadArg: ") + c.memoryText);
+        EXPECT_EQ(thrownBy([&] { parsed(c.head); }), std::string("FNEBadArg: ") + c.memoryText);
         std::istringstream stream(std::string(c.head.begin(), c.head.end()));
-        EXPECT_EQ(messageOf([&] { Package{stream}; }), std::string("FNEIOError: ") + c.streamText);
+        EXPECT_EQ(thrownBy([&] { Package{stream}; }), std::string("FNEIOError: ") + c.streamText);
     }
     Endless zeros(cases[1].head);
     std::istream stream(&zeros);
@@ -209,16 +205,16 @@ TEST(Package, WrongShapesAreNamed) {
          },
          "inconsistency detected converting to list<Package> from an invalid package"},
     };
-    for (const auto& c : cases) EXPECT_EQ(messageOf(c.call), std::string("FNEBadArg: ") + c.text);
+    for (const auto& c : cases) EXPECT_EQ(thrownBy(c.call), std::string("FNEBadArg: ") + c.text);
 }
 
 TEST(Package, AFailedWriteIsReported) {
     std::ostringstream broken;
     broken.setstate(std::ios::badbit);
-    EXPECT_EQ(messageOf([&] { Package(1).write(broken); }), "FNEIOError: Package: error writing to ostream");
+    EXPECT_EQ(thrownBy([&] { Package(1).write(broken); }), "FNEIOError: Package: error writing to ostream");
     std::FILE* const full = std::fopen("/dev/full", "w");
     std::setvbuf(full, nullptr, _IONBF, 0);
-    EXPECT_EQ(messageOf([&] { Package(1).write(full); }), "FNEIOError: Package: error writing to FILE");
+    EXPECT_EQ(thrownBy([&] { Package(1).write(full); }), "FNEIOError: Package: error writing to FILE");
     std::fclose(full);
 }
 

@@ -1,0 +1,58 @@
+#include "fn/message/dialog.h"
+
+#include <ctime>
+#include <iostream>
+#include <mutex>
+
+namespace {
+
+/// Date, one blank, time of day.
+std::string localTime() {
+    const std::time_t now = std::time(nullptr);
+    std::tm parts{};
+    localtime_r(&now, &parts);
+    char text[64];
+    std::strftime(text, sizeof text, "%Y-%m-%d %H:%M:%S", &parts);
+    return text;
+}
+
+void writeLine(std::ostream& stream, const char* kind, const std::string& message) {
+    static std::mutex& oneLineAtATime = *new std::mutex; // messages come until the very end of the process
+    const std::lock_guard lock(oneLineAtATime);
+    stream << "[" + localTime() + "]" + kind + message << std::endl;
+}
+
+std::mutex& sinkMutex = *new std::mutex;
+
+FNCountedPtr<FNDialog::Body>& sink() {
+    static auto& current = *new FNCountedPtr<FNDialog::Body>;
+    return current;
+}
+
+} // namespace
+
+FNCountedPtr<FNDialog::Body> FNDialog::get() {
+    const std::lock_guard lock(sinkMutex);
+    if (!sink()) sink() = FNCountedPtr<Body>(new FNStdDialog);
+    return sink();
+}
+
+void FNDialog::set(const FNCountedPtr<Body>& body) {
+    FNCountedPtr<Body> old; // goes after the lock: its destructor may have something to say
+    const std::lock_guard lock(sinkMutex);
+    old = sink();
+    sink() = body ? body : FNCountedPtr<Body>(new FNStdDialog);
+}
+
+void FNStdDialog::log(const std::string& message) {
+    writeLine(std::clog, "", message);
+}
+void FNStdDialog::info(const std::string& message) {
+    writeLine(std::cout, "Info: ", message);
+}
+void FNStdDialog::warn(const std::string& message) {
+    writeLine(std::cerr, "Warning: ", message);
+}
+void FNStdDialog::error(const std::string& message) {
+    writeLine(std::cerr, "Error: ", message);
+}

@@ -1,0 +1,104 @@
+#include "orbek/orbek_properties.h"
+
+#include "fg/capture_types.h"
+#include "fn/deployment/composite_values.h"
+
+namespace Orbek {
+
+using namespace Fn::Deployment;
+
+namespace {
+
+/// A member whose subsystem is not built yet: a record without members under its final name.
+Property pending(const std::string& name, const std::string& typeId, const std::string& doc) {
+    return Property(Type(typeId, doc, "", false), name, "", doc, false);
+}
+
+struct ComparisonAlgorithms {
+    static std::string typeId() { return "ComparisonAlgorithms"; }
+    static Type define() {
+        return Type(typeId(), "Available comparison algorithms",
+                    properties(pending("B7", "Cmp::B7::CmpAlgorithm", "B7 Comparison Algorithm"),
+                               pending("B6", "Cmp::B6::CmpAlgorithm", "B6 Comparison Algorithm"),
+                               pending("A14", "Cmp::A14::CmpAlgorithm", "A14 Comparison Algorithm"),
+                               pending("B6L5", "Cmp::Implementation::B6L5", "B6L5 Comparison Algorithm")),
+                    "", false);
+    }
+};
+
+struct ComparisonModule {
+    static std::string typeId() { return "ComparisonModule"; }
+    static Type define() {
+        return Type(
+            typeId(), "Comparison Modules and settings",
+            properties(property<Alternative<ComparisonAlgorithms>>::create(
+                           "AlgorithmVersion", "Select the algorithm to be used by the matching engine"),
+                       propertyWithDefault<Int>::create(
+                           "NumberOfThreads", 1,
+                           "Number of parallel threads to be launched for FIR-population comparison "
+                           "(Identification): 0 or 1 means no additional threads (default: 1). For using N "
+                           "CPU's, set this value to N.")),
+            "", false);
+    }
+};
+
+/// Camera control is not built yet: a record without members.
+struct CamControl {
+    static std::string typeId() { return "Kx::CamControl"; }
+    static Type define() { return Type(typeId(), "", "", false); }
+};
+
+std::list<Property> members() {
+    return properties(
+        pending("FaceFinder", "Eye::Cara::T8::FaceFinder", "Face Finder"),
+        pending("EyesFinder", "Eye::Ojo::T8::EyesFinder", "Eyes Finder to use."),
+        property<ComparisonModule>::create("ComparisonAlgorithm", "Type of Comparison Algorithm"),
+        pending("SetEnroller", "Kx::SetEnroller", "Set Enroller"),
+        pending("StreamEnroller", "Kx::StreamEnroller", "Stream Enroller"),
+        pending("StreamVerifier", "Kx::StreamRecognizer", "Stream Verifier"),
+        pending("StreamIdentifier", "Kx::StreamIdentifier", "Stream Identifier"),
+        pending("SetVerifier", "Kx::SetRecognizer", "Set Verifier"),
+        pending("SetIdentifier", "Kx::SetIdentifier", "Set Identifier"),
+        pending("FaceTracker", "Eye::ReferenceFaceTracker", "Face Tracker Engine"),
+        pending("PortraitAnalyzer", "Cmp::Portrait::Analyzer", "Portrait Analyzer"),
+        pending("ISOFullFrontalTest", "Kx::ISO_19794_5::FullFrontal::Test",
+                "ISO 19794-5 Full Frontal images assessment"),
+        pending("FeatureTest", "Kx::Feature::Test", "Portrait feature assessment"),
+        pending("CropFullFrontal", "CropToFullFrontal", "ISO 19794-5 Full Frontal images cropping"),
+        pending("CropTokenImage", "CropToTokenImage", "ISO 19794-5 Token images cropping"),
+        pending("FgDllCache", "FG::DllFrameGrabberFactoryCacheDef",
+                "Definition of DLL load paths for capture devices"),
+        property<Container<FG::FrameGrabberFactoryDef>>::create("CaptureDevices",
+                                                                "Configuration of capture devices"),
+        property<Container<CamControl>>::create(
+            "CameraControllers", "The controller settings for automatic adjustment ofcamera parameters"),
+        property<Container<String>>::create(
+            "Substitutions",
+            "Variable substitutions. All variables in this container can be referenced in other "
+            "configurable items' values. e.g. reference INSTALLDIR as $INSTALLDIR"));
+}
+
+/// One ready-made capture device, and the two standard variables.
+std::list<Default> imposedDefaults() {
+    const std::string files = "CaptureDevices.Files";
+    const std::string location = files + ".ImageFiles.FileLocation";
+    using Devices = Container<FG::FrameGrabberFactoryDef>;
+    return {
+        Default(type<Devices>(), "CaptureDevices", "Files"),
+        defaultValue<FG::FrameGrabberFactoryDef>::create(files, "ImageFiles"),
+        defaultValue<Alternative<FG::MultiFileLocations>>::create(location, "Files"),
+        Default(type<Container<String>>(), location + ".Files", "bob alice"),
+        defaultValue<String>::create(location + ".Files.bob", "$INSTALLDIR/examples/images/bob1.jpg"),
+        defaultValue<String>::create(location + ".Files.alice", "$INSTALLDIR/examples/images/alice1.jpg"),
+        Default(type<Container<String>>(), "Substitutions", "INSTALLDIR FGLIBDIR"),
+        defaultValue<String>::create("Substitutions.FGLIBDIR", "lib/x86_64/"),
+    };
+}
+
+} // namespace
+
+Type ORBEKProperties::define() {
+    return Type(typeId(), "Tessarin SDK Resources", members(), imposedDefaults(), "", false);
+}
+
+} // namespace Orbek

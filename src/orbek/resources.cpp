@@ -1,0 +1,20 @@
+#include "orbek/resources.h"
+
+#include "orbek/orbek_properties.h"
+
+namespace Orbek {
+
+using Fn::Deployment::Component;
+using Fn::Deployment::Property;
+
+Resources::Resources(const FNCountedPtr<AppConfigDB>& configDb)
+    : configDb_(configDb),
+      rootComponent_(configDb, Property(Fn::Deployment::type<ORBEKProperties>(), "ORBEK",
+                                        Fn::Deployment::type<ORBEKProperties>().defaultValue(), "", false)) {}
+
+Component Resources::rootComponent() const {
+    const FNMutexLock lock(mutex_);
+    return rootComponent_;
+}
+
+} // namespace Orbek

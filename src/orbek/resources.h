@@ -1,0 +1,47 @@
+#pragma once
+
+#include "fn/deployment/app_config_db.h"
+#include "fn/deployment/component.h"
+#include "fn/thread/mutex.h"
+
+namespace Orbek {
+
+/// What all objects made from one configuration share: the tree of settings, and the heavy engines, each made
+/// at the first request for it.
+class Resources {
+public:
+    explicit Resources(const FNCountedPtr<AppConfigDB>& configDb);
+
+    Fn::Deployment::Component rootComponent() const;
+    FNCountedPtr<AppConfigDB> configDb() const { return configDb_; }
+
+private:
+    /// Held while an engine is made; recursive, since making one engine may ask for another.
+    FNMutex mutex_{FNMutex::recursive};
+    FNCountedPtr<AppConfigDB> configDb_;
+    Fn::Deployment::Component rootComponent_;
+};
+
+/// One shared engine: goes once from unmade to made.
+template <class Engine> class MadeOnce {
+public:
+    /// The engine, made by `make()`, which returns a new one, at the first call. A failure leaves it unmade.
+    /// @param title begins the text of a failure
+    /// @throws FNEGeneric "<title> : <reason>" if it cannot be made
+    template <class Make>
+    const FNCountedPtr<Engine>& get(const FNMutex& mutex, const std::string& title, Make make) const {
+        const FNMutexLock lock(mutex);
+        if (engine_) return engine_;
+        try {
+            engine_ = FNCountedPtr<Engine>(make());
+        } catch (const std::exception& e) {
+            FN_THROW(FNEGeneric, title + " : " + e.what());
+        }
+        return engine_;
+    }
+
+private:
+    mutable FNCountedPtr<Engine> engine_;
+};
+
+} // namespace Orbek
