@@ -7,7 +7,6 @@
 #include <climits>
 #include <memory>
 
-#include <cxxabi.h>
 #include <fcntl.h>
 #include <poll.h>
 #include <unistd.h>
@@ -128,7 +127,7 @@ void FNThreadImpl::start(const FNCountedPtr<FNThreadImpl>& self) {
     Attributes attributes;
     setStackSize(attributes.attributes);
     const FNEvent started;
-    auto launch = std::make_unique<Launch>(self, started);
+    std::unique_ptr<Launch> launch(new Launch{self, started});
     if (const int code = pthread_create(&self->thread_, &attributes.attributes, &launched, launch.get()))
         FN_THROW(FNESysError, createFailure(code));
     launch.release();
@@ -173,9 +172,8 @@ void FNThreadImpl::run() {
         setState(FNThreadState::ended, "Cancelled.");
     } catch (const std::exception& e) {
         setState(FNThreadState::failed, e.what());
-    } catch (const abi::__forced_unwind&) {
-        throw; // terminate() unwinds the stack by this, and must not be stopped
     } catch (...) {
+        if (!std::current_exception()) throw; // terminate() unwinds the stack, and must not be stopped
         setState(FNThreadState::failed, "Unknown exception.");
     }
 }

@@ -1,4 +1,5 @@
 #include "fn/sparse_image.h"
+#include "support/thrown.h"
 
 #include <gtest/gtest.h>
 
@@ -12,15 +13,6 @@ FNImage<int> numbered(std::uint32_t w, std::uint32_t h) {
     FNImage<int> image(w, h);
     std::iota(image.getExclusive(), image.getExclusive() + image.size(), 0);
     return image;
-}
-
-template <class Call> std::string messageOf(Call call) {
-    try {
-        call();
-    } catch (const FNException& e) {
-        return std::string(e.typeId()) + ": " + e.what();
-    }
-    return "nothing thrown";
 }
 
 TEST(Geometry, RealsBecomeGridPositionsWithoutOverflow) {
@@ -161,7 +153,7 @@ TEST(SparseImages, RefuseRangesThatDoNotFit) {
         {{0, 3, 0, 0}, good, "FNEBadArg: The data of a SparseImage do not have the size of its ranges"},
         {good, {3, 5, 0, 0}, "nothing thrown"}};
     for (const auto& c : cases)
-        EXPECT_EQ(messageOf([&] { SparseImage<int>(data, c.pixels, c.lines, 3, 5); }), c.message);
+        EXPECT_EQ(thrownBy([&] { SparseImage<int>(data, c.pixels, c.lines, 3, 5); }), c.message);
 }
 
 } // namespace

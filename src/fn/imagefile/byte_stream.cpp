@@ -1,0 +1,91 @@
+#include "fn/imagefile/byte_stream.h"
+
+#include <filesystem>
+#include <vector>
+
+namespace Fn {
+
+namespace {
+
+[[noreturn]] void refuse(const char* caller) {
+    FN_THROW(FNEIOError, std::string(caller) + ": cannot read from stream");
+}
+
+} // namespace
+
+std::string peekBytes(std::istream& stream, std::size_t n, const char* caller) {
+    if (!stream) refuse(caller);
+    const std::istream::pos_type start = stream.tellg();
+    std::string bytes(n, '\0');
+    stream.read(bytes.data(), static_cast<std::streamsize>(n));
+    bytes.resize(static_cast<std::size_t>(stream.gcount()));
+    if (stream.bad()) refuse(caller);
+    stream.clear();
+    if (start != std::istream::pos_type(-1)) {
+        stream.seekg(start);
+    } else {
+        for (std::size_t i = 0; i < bytes.size(); ++i) stream.unget();
+    }
+    if (!stream) refuse(caller);
+    return bytes;
+}
+
+FNRMem<unsigned char> readRest(std::istream& stream, std::uint64_t maxBytes, const char* caller) {
+    if (!stream) refuse(caller);
+    constexpr std::size_t firstStep = 1u << 16;
+    std::vector<unsigned char> bytes;
+    // Memory follows what has arrived: each step doubles it.
+    for (std::size_t step = firstStep; stream; step = bytes.size()) {
+        const std::size_t before = bytes.size();
+        bytes.resize(before + step);
+        stream.read(reinterpret_cast<char*>(bytes.data() + before), static_cast<std::streamsize>(step));
+        bytes.resize(before + static_cast<std::size_t>(stream.gcount()));
+        if (bytes.size() > maxBytes)
+            FN_THROW(FNEBadFormat, std::string(caller) + ": the file exceeds the limit of " +
+                                       std::to_string(maxBytes) + " bytes for decoding");
+    }
+    if (stream.bad()) refuse(caller);
+    FNRMem<unsigned char> result(bytes.size());
+    std::copy(bytes.begin(), bytes.end(), result.getExclusive());
+    return result;
+}
+
+std::ifstream openForReading(const std::string& fileName, const char* failure) {
+    std::ifstream file(fileName, std::ios::binary);
+    std::error_code ignored;
+    if (!file || std::filesystem::is_directory(fileName, ignored)) FN_THROW(FNEIOError, failure + fileName);
+    return file;
+}
+
+std::ofstream openForWriting(const std::string& fileName) {
+    std::ofstream file(fileName, std::ios::binary);
+    if (!file) FN_THROW(FNEIOError, "Could not open file for writing: " + fileName);
+    return file;
+}
+
+void writeBytes(std::ostream& stream, std::span<const unsigned char> bytes, const char* failure) {
+    stream.write(reinterpret_cast<const char*>(bytes.data()), static_cast<std::streamsize>(bytes.size()));
+    if (!stream.flush()) FN_THROW(FNEIOError, failure);
+}
+
+MemoryStream::Buffer::Buffer(const char* data, std::size_t size) {
+    char* const begin = const_cast<char*>(data); // only ever read
+    setg(begin, begin, begin + size);
+}
+
+std::streambuf::pos_type MemoryStream::Buffer::seekoff(off_type offset, std::ios_base::seekdir from,
+                                                       std::ios_base::openmode) {
+    const off_type size = egptr() - eback();
+    const off_type base = from == std::ios_base::beg   ? 0
+                          : from == std::ios_base::cur ? gptr() - eback()
+                                                       : size;
+    if (offset < -base || offset > size - base) return pos_type(off_type(-1));
+    setg(eback(), eback() + base + offset, egptr());
+    return pos_type(base + offset);
+}
+
+std::streambuf::pos_type MemoryStream::Buffer::seekpos(pos_type pos, std::ios_base::openmode which) {
+    return seekoff(off_type(pos), std::ios_base::beg, which);
+}
+
+} // namespace Fn

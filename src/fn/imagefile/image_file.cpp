@@ -1,0 +1,62 @@
+#include "fn/imagefile/image_file.h"
+
+#include "fn/imagefile/bmp.h"
+#include "fn/imagefile/byte_stream.h"
+#include "fn/imagefile/gunzip.h"
+#include "fn/imagefile/j2k.h"
+#include "fn/imagefile/jpeg.h"
+#include "fn/imagefile/pbm.h"
+#include "fn/imagefile/png.h"
+#include "fn/imagefile/tiff.h"
+
+namespace Fn {
+
+namespace {
+
+constexpr const char* streamName = "input stream";
+
+/// @param fileName looked at again if the stream turns out to be gzip; empty if there is no file or it was so
+/// already
+FNImageReference readAnyFormat(std::istream& stream, const std::string& name, const std::string& fileName,
+                               const ReadImagePropertiesFeedback& feedback, const ImageLimits& limits) {
+    if (checkIfIsJpeg(stream)) return readJpeg(stream, feedback, limits);
+    if (checkIfIsPng(stream)) return readPng(stream, feedback, limits);
+    if (checkIfIsJ2k(stream)) return readJ2k(stream, feedback, limits);
+    if (checkIfIsTiff(stream)) return readTiff(stream, streamName, 0, feedback, limits);
+    if (checkIfIsPbm(stream)) return readPbm(stream, feedback, limits);
+    const std::string start = peekBytes(stream, 2, "Fn::readImage");
+    if (start.empty()) FN_THROW(FNEBadArg, "Fn::readImage: cannot read " + name);
+    if (start == "BM") return readBMP(stream, feedback, limits);
+    if (start == "\x1F\x8B" && !fileName.empty()) {
+        MemoryStream content(gunzip(fileName, limits));
+        return readAnyFormat(content, name, {}, feedback, limits);
+    }
+    FN_THROW(FNEBadArg, "Fn::readImage: Not a known image format in " + name);
+}
+
+} // namespace
+
+FNImageReference readImage(const std::string& fileName, const ReadImagePropertiesFeedback& feedback,
+                           const ImageLimits& limits) {
+    std::ifstream file = openForReading(fileName);
+    return readAnyFormat(file, fileName, fileName, feedback, limits);
+}
+
+FNImageReference readImage(std::istream& stream, const ReadImagePropertiesFeedback& feedback,
+                           const ImageLimits& limits) {
+    return readAnyFormat(stream, streamName, {}, feedback, limits);
+}
+
+FNImageReference readImage(const char* data, unsigned long size, const ReadImagePropertiesFeedback& feedback,
+                           const ImageLimits& limits) {
+    MemoryStream stream(data, size);
+    return readImage(stream, feedback, limits);
+}
+
+void writeImage(const FNImageReference& image, const std::string& fileName, FNImageCompressor::Mode mode) {
+    if (mode != FNImageCompressor::LOSSLESS) return saveJpeg(image, fileName, mode);
+    std::ofstream file = openForWriting(fileName);
+    image.isColor() ? writePpm(image, file) : writePgm(image, file);
+}
+
+} // namespace Fn
