@@ -1,9 +1,12 @@
 #include "eye/discriminator/cascade_scaling.h"
 
+#include "eye/discriminator/alpha_order.h"
+
 #include <algorithm>
 #include <charconv>
 #include <cmath>
 #include <limits>
+#include <map>
 #include <numeric>
 
 namespace Eye::Implementation {
@@ -61,15 +64,9 @@ std::vector<std::uint32_t> evaluationOrder(const std::vector<float>& alphas,
                                            const std::vector<FloatStep>& steps) {
     std::vector<std::uint32_t> order(alphas.size());
     std::iota(order.begin(), order.end(), 0u);
-    const auto before = [&](std::uint32_t i, std::uint32_t j) {
-        const bool positive = alphas[i] > 0;
-        if (positive != (alphas[j] > 0)) return positive;
-        if (alphas[i] != alphas[j]) return positive ? alphas[i] > alphas[j] : alphas[i] < alphas[j];
-        return positive ? i > j : i < j;
-    };
     std::uint32_t first = 0;
     for (const FloatStep& step : steps) {
-        std::sort(order.begin() + first, order.begin() + step.limit, before);
+        sortByAlpha(order.begin() + first, order.begin() + step.limit, alphas.data());
         first = step.limit;
     }
     return order;

@@ -14,13 +14,10 @@ struct FloatStep {
 };
 
 /// The steps of a configured cascade in ascending order; the last one alone if nothing is configured.
-/// @throws FNEBadArg for an entry that is no number; FNEOutOfRange for one beyond the `n` support vectors, or
-/// 0
+/// @throws FNEBadArg for an entry that is no number; FNEOutOfRange for one beyond the `n` support vectors
 std::vector<FloatStep> readSteps(const CascadeSettings& settings, std::size_t n);
 
-/// Order of evaluation of the support vectors: step by step, the positive alphas of a step descending, then
-/// the others ascending. So the sum of a step first climbs as far as it can, and then can only fall. Of equal
-/// alphas, the later vector is first among the positive ones, the earlier among the others.
+/// Order of evaluation of the support vectors: step by step, within each by alpha (alpha_order.h).
 std::vector<std::uint32_t> evaluationOrder(const std::vector<float>& alphas,
                                            const std::vector<FloatStep>& steps);
 

@@ -67,49 +67,55 @@ template <class Kernel, class Layout>
 CascadedSvmDiscriminator<Kernel, Layout>::CascadedSvmDiscriminator(const CascadeSettings& settings,
                                                                    const std::string& templatePath) {
     const std::string path = templatePath + "/" + settings.file;
+    /// A failure of the content names the file.
+    const auto fromFile = [&](auto reading) {
+        try {
+            reading();
+        } catch (const FNException& e) {
+            FN_THROW(FNEIOError, "CascadedSvmDiscriminator: error during read of template file `" + path +
+                                     "' : " + e.what());
+        }
+    };
     TrainedSvm trained;
-    try {
+    fromFile([&] {
         std::ifstream file(path, std::ios::binary);
         if (!file) FN_THROW(FNEIOError, "file could not be opened for reading");
         trained = TrainedSvm::read(file, KernelTraits<Kernel>::trained);
-        for (Signs& vector : trained.supportVectors) vector = Layout::convert(vector);
-    } catch (const FNException& e) {
-        FN_THROW(FNEIOError,
-                 "CascadedSvmDiscriminator: error during read of template file `" + path + "' : " + e.what());
-    }
-    load(trained, settings);
+    });
+    const std::vector<FloatStep> steps = readSteps(settings, trained.alphas.size());
+    fromFile([&] { load(trained, steps); });
+    processingId_ = makeProcessingId(KernelTraits<Kernel>::text, Layout::text(), settings);
 }
 
 template <class Kernel, class Layout>
 CascadedSvmDiscriminator<Kernel, Layout>::CascadedSvmDiscriminator(const TrainedSvm& trained,
-                                                                   const CascadeSettings& settings) {
+                                                                   const CascadeSettings& settings)
+    : processingId_(makeProcessingId(KernelTraits<Kernel>::text, Layout::text(), settings)) {
     if (trained.kernel != KernelTraits<Kernel>::trained ||
         trained.alphas.size() != trained.supportVectors.size())
         FN_THROW(FNEBadArg, "CascadedSvmDiscriminator: machine of another kernel or incomplete");
-    TrainedSvm converted(trained);
-    for (Signs& vector : converted.supportVectors) vector = Layout::convert(vector);
-    load(converted, settings);
+    load(trained, readSteps(settings, trained.alphas.size()));
 }
 
 template <class Kernel, class Layout>
 void CascadedSvmDiscriminator<Kernel, Layout>::load(const TrainedSvm& trained,
-                                                    const CascadeSettings& settings) {
+                                                    const std::vector<FloatStep>& steps) {
     if (trained.alphas.empty()) FN_THROW(FNEBadFormat, "invalid alphas");
-    const std::vector<FloatStep> steps = readSteps(settings, trained.alphas.size());
-    const std::uint32_t dimension = trained.supportVectors.front().size();
-    scaleKernel(trained, dimension, kernel_);
+    trained.requireFinite();
+    std::vector<Signs> converted;
+    for (const Signs& vector : trained.supportVectors) converted.push_back(Layout::convert(vector));
+    scaleKernel(trained, converted.front().size(), kernel_);
 
     const double factor = alphaFactor(kernel_);
     std::vector<float> alphas;
     std::vector<Signs> vectors;
     for (const std::uint32_t i : evaluationOrder(trained.alphas, steps)) {
         alphas.push_back(static_cast<float>(static_cast<double>(trained.alphas[i]) * factor));
-        vectors.push_back(trained.supportVectors[i]);
+        vectors.push_back(converted[i]);
     }
     resultScale_ = scaleTables(alphas, trained.bias, steps, tables_);
     tables_.earlyExit = trained.kernel == TrainedSvm::Kernel::FullPolynomialDegree2;
     setVectors(vectors, tables_);
-    processingId_ = makeProcessingId(KernelTraits<Kernel>::text, Layout::text(), settings);
 }
 
 template <class Kernel, class Layout>

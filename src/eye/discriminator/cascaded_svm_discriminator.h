@@ -1,10 +1,10 @@
 #pragma once
 
+#include "eye/discriminator/cascade_settings.h"
 #include "eye/discriminator/cascade_tables.h"
 #include "eye/discriminator/sod_conversion.h"
 #include "eye/discriminator/trained_svm.h"
 
-#include <map>
 #include <string>
 #include <vector>
 
@@ -19,38 +19,33 @@
 
 namespace Eye::Implementation {
 
-/// Which file to read and where to stop.
-struct CascadeSettings {
-    struct Entry {
-        std::string steps; ///< how many support vectors have been seen, a decimal number
-        float threshold;   ///< what the decision value has to reach by then
-    };
+struct FloatStep;
 
-    std::string file; ///< relative to the template path
-    /// Empty for the single step of all support vectors at the threshold -99.
-    std::vector<Entry> cascade;
-};
-
-/// Layouts of the support vectors in evaluation, and how each comes from the trained bit order.
+/// Layouts of the support vectors in evaluation, and how each comes from the trained bit order. With the
+/// filler 0, a vector in trained order becomes what a window of the scan holds.
 struct TrainedLayout {
     static std::string text() { return "TL"; }
-    static Fn::SignValueVector<int> convert(const Fn::SignValueVector<int>& trained) { return trained; }
+    static Fn::SignValueVector<int> convert(const Fn::SignValueVector<int>& trained, unsigned char = 0) {
+        return trained;
+    }
 };
 
 template <std::uint32_t columns, std::uint32_t rows> struct CombinedSodsColumn32BitAlignedLayout {
     static std::string text() { return "Col" + std::to_string(columns) + "x" + std::to_string(rows); }
-    static Fn::SignValueVector<int> convert(const Fn::SignValueVector<int>& trained) {
+    static Fn::SignValueVector<int> convert(const Fn::SignValueVector<int>& trained,
+                                            unsigned char filler = halfSetFiller) {
         return SodConversion::sod2csod(trained, columns, rows, SodConversion::SodLayout::ColumnAligned,
-                                       halfSetFiller);
+                                       filler);
     }
 };
 
 template <std::uint32_t columns, std::uint32_t rows, std::uint32_t directions>
 struct SparseGaborSodColumnAlignedLayout {
     static std::string text() { return "Col" + std::to_string(columns) + "x" + std::to_string(rows); }
-    static Fn::SignValueVector<int> convert(const Fn::SignValueVector<int>& trained) {
+    static Fn::SignValueVector<int> convert(const Fn::SignValueVector<int>& trained,
+                                            unsigned char filler = halfSetFiller) {
         return GSodConversion::sod2ssod(trained, columns, rows, directions,
-                                        GSodConversion::GSodLayout::ColumnAligned, halfSetFiller);
+                                        GSodConversion::GSodLayout::ColumnAligned, filler);
     }
 };
 
@@ -67,6 +62,9 @@ template <> struct KernelTraits<FpKernelDeg2> {
 
 template <class Kernel, class Layout> class CascadedSvmDiscriminator {
 public:
+    using KernelType = Kernel;
+    using LayoutType = Layout;
+
     /// Score of a rejected vector.
     static constexpr float rejected = -99.0f;
 
@@ -74,6 +72,9 @@ public:
     /// @throws FNEIOError that names the file and what is wrong with it; FNEBadArg for a step that is no
     /// number, and FNEOutOfRange for one beyond the number of support vectors
     CascadedSvmDiscriminator(const CascadeSettings& settings, const std::string& templatePath);
+    /// With the settings of a component of type CascadeSettings.
+    CascadedSvmDiscriminator(const Fn::Deployment::Component& component, const std::string& templatePath)
+        : CascadedSvmDiscriminator(CascadeSettings::read(component), templatePath) {}
     /// From a machine in memory, whose vectors are in trained order and bit order.
     /// @throws FNEBadFormat if it cannot be scaled to integers; for steps as above
     CascadedSvmDiscriminator(const TrainedSvm& trained, const CascadeSettings& settings);
@@ -96,7 +97,7 @@ public:
     float resultScale() const noexcept { return resultScale_; }
 
 private:
-    void load(const TrainedSvm& trained, const CascadeSettings& settings);
+    void load(const TrainedSvm& trained, const std::vector<FloatStep>& steps);
 
     Kernel kernel_;
     CascadeTables tables_;

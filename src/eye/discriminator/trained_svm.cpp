@@ -1,5 +1,6 @@
 #include "eye/discriminator/trained_svm.h"
 
+#include <cmath>
 #include <iomanip>
 #include <istream>
 #include <limits>
@@ -56,6 +57,7 @@ TrainedSvm TrainedSvm::read(std::istream& stream, Kernel kernel) {
     readHeader(stream, svm);
     const FNVector<float> alphas(readPackage(stream, "invalid alphas"));
     svm.alphas.assign(alphas.begin(), alphas.end());
+    svm.requireFinite();
     for (std::size_t i = 0; i < svm.alphas.size(); ++i) {
         const std::string failure = "invalid support vector[" + std::to_string(i) + "]";
         svm.supportVectors.emplace_back(readPackage(stream, failure));
@@ -77,6 +79,11 @@ void TrainedSvm::write(std::ostream& stream) const {
     stream.precision(digits);
     Fn::Package(FNVector<float>(alphas)).write(stream);
     for (const auto& vector : supportVectors) Fn::Package(vector).write(stream);
+}
+
+void TrainedSvm::requireFinite() const {
+    for (const float alpha : alphas)
+        if (!std::isfinite(alpha)) FN_THROW(FNEBadFormat, "invalid alphas");
 }
 
 double TrainedSvm::evaluate(const Fn::SignValueVector<int>& x) const {

@@ -33,6 +33,9 @@ struct TrainedSvm {
     /// @throws FNEIOError
     void write(std::ostream& stream) const;
 
+    /// @throws FNEBadFormat if an alpha is no number
+    void requireFinite() const;
+
     /// The decision value in double precision, the reference for faster forms.
     double evaluate(const Fn::SignValueVector<int>& x) const;
 };
