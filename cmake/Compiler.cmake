@@ -1,6 +1,8 @@
 # Flags that hold for every target of the project.
 
 add_compile_options(-Wall -Wextra -Wpedantic -Wshadow -Wnon-virtual-dtor -Woverloaded-virtual)
+# Products and sums round separately everywhere, so that every instruction set gives the bits of the plain form.
+add_compile_options(-ffp-contract=off)
 if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU" AND CMAKE_CXX_COMPILER_VERSION VERSION_LESS 13)
     # GCC 12 reports accesses inside inlined standard containers that cannot happen.
     add_compile_options(-Wno-stringop-overflow -Wno-array-bounds -Wno-restrict)

@@ -18,10 +18,10 @@ struct ImageLimits;
 class FNImageReference {
 public:
     /// How serialize() writes the pixels.
-    enum SerializationStrategy { UNCOMPRESSED_RAW = 0, COMPRESSED_PNG = 1, COMPRESSED_JPEGLS = 2 };
+    enum SerializationStrategy : int { UNCOMPRESSED_RAW = 0, COMPRESSED_PNG = 1, COMPRESSED_JPEGLS = 2 };
 
     /// The stored pixel type.
-    enum PixelType { MONO8 = 0, MONO16 = 1, MONO_FLOAT = 2, BGRA32 = 3, RGB48 = 4 };
+    enum PixelType : int { MONO8 = 0, MONO16 = 1, MONO_FLOAT = 2, BGRA32 = 3, RGB48 = 4 };
 
     /// What a handle refers to. To derive another one, see AttributedImageRepresentation.
     class Representation {

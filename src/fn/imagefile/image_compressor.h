@@ -9,8 +9,8 @@
 /// Images as blocks of compressed bytes.
 class FNImageCompressor {
 public:
-    enum Mode { LOSSLESS = 0, BEST_QUALITY = 1, MEDIUM_QUALITY = 2, LOW_QUALITY = 3 };
-    enum Format { JPEG = 0, GZIP = 1 };
+    enum Mode : int { LOSSLESS = 0, BEST_QUALITY = 1, MEDIUM_QUALITY = 2, LOW_QUALITY = 3 };
+    enum Format : int { JPEG = 0, GZIP = 1 };
 
     using Bytes = FNRMem<unsigned char>;
 

@@ -77,7 +77,7 @@ void checkSizes(const FNRMem<unsigned char>& file, Container container, const Im
         refuseUndecodable(" Too many tiles.");
 }
 
-/// The library's decoder over one file.
+/// Decodes one file. The library knows the colour space only behind the pixels.
 class Decoder {
 public:
     Decoder(const FNRMem<unsigned char>& file, Container container)
@@ -88,22 +88,17 @@ public:
         opj_dparameters_t parameters;
         opj_set_default_decoder_parameters(&parameters);
         opj_image_t* image = nullptr;
-        const bool good = opj_setup_decoder(codec_.get(), &parameters) &&
-                          opj_read_header(input_.stream(), codec_.get(), &image);
+        bool good = opj_setup_decoder(codec_.get(), &parameters) &&
+                    opj_read_header(input_.stream(), codec_.get(), &image);
         image_.reset(image);
+        good = good && opj_decode(codec_.get(), input_.stream(), image) &&
+               opj_end_decompress(codec_.get(), input_.stream());
         if (!good) refuseUndecodable(report_.text);
-    }
-
-    /// What the header says; after decode(), the image.
-    const opj_image_t& image() const { return *image_; }
-
-    void decode() {
-        if (!opj_decode(codec_.get(), input_.stream(), image_.get()) ||
-            !opj_end_decompress(codec_.get(), input_.stream()))
-            refuseUndecodable(report_.text);
         for (OPJ_UINT32 i = 0; i < image_->numcomps; ++i)
             if (!image_->comps[i].data) refuseUndecodable(" A component has no data.");
     }
+
+    const opj_image_t& image() const { return *image_; }
 
 private:
     J2k::Report report_;
@@ -260,15 +255,14 @@ FNImageReference readJ2k(std::istream& stream, const ReadImagePropertiesFeedback
     if (container == Container::None)
         FN_THROW(FNEBadFormat, "Fn::readJ2k: stream does not refer to a known JPEG2000 image format.");
     checkSizes(file, container, limits);
-    Decoder decoder(file, container);
-
+    const Decoder decoder(file, container);
     const opj_image_t& image = decoder.image();
+    const Mode family = familyOf(image);
     unsigned int depth = 0;
     for (OPJ_UINT32 i = 0; i < image.numcomps; ++i) depth += image.comps[i].prec;
-    feedback.compressionMode(familyOf(image));
+    feedback.compressionMode(family);
     feedback.pixelDepth(depth);
-    decoder.decode();
-    return toReference(image, familyOf(image));
+    return toReference(image, family);
 }
 
 FNImageReference loadJ2k(const std::string& fileName, const ReadImagePropertiesFeedback& feedback,

@@ -126,6 +126,7 @@ void refuseCutScans(const FNRMem<unsigned char>& file, std::vector<unsigned char
 
 FNImageReference decode(const FNRMem<unsigned char>& file, const ReadImagePropertiesFeedback& feedback,
                         const ImageLimits& limits) {
+    if (file.empty()) FN_THROW(FNEBadFormat, "readJpegLS(): Compressed buffer too small");
     const charls::jpegls_decoder decoder(file.data(), file.size(), true);
     Samples samples{decoder.frame_info(), decoder.interleave_mode() == charls::interleave_mode::none, {}};
     const int bits = samples.frame.bits_per_sample, components = samples.frame.component_count;

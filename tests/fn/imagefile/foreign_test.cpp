@@ -151,33 +151,33 @@ TEST_F(ForeignFiles, Jpeg2000) {
 
 TEST_F(ForeignFiles, Jpeg2000OfOtherDepthsAndColorSpaces) {
     if (!Workshop::has("opj_compress")) GTEST_SKIP() << "opj_compress is not installed";
-    std::string five = "P5 13 9 31\n",
-                two = "P7\nWIDTH 13\nHEIGHT 9\nDEPTH 2\nMAXVAL 255\nTUPLTYPE GRAYSCALE_ALPHA\nENDHDR\n";
-    for (const unsigned char v : grayPicture().span()) {
-        five += static_cast<char>(v >> 3);
+    const FNImage<unsigned char> picture = grayPicture();
+    std::string six, two = "P7\nWIDTH 13\nHEIGHT 9\nDEPTH 2\nMAXVAL 255\nTUPLTYPE GRAYSCALE_ALPHA\nENDHDR\n";
+    for (const unsigned char v : picture.span()) {
+        six += static_cast<char>(v >> 2);
         two += {static_cast<char>(v), 1};
     }
-    workshop.write("five.pgm", five);
-    workshop.run("opj_compress -i five.pgm -o a.j2k -n 2");
+    workshop.write("six.raw", six);
+    workshop.run("opj_compress -i six.raw -F 13,9,1,6,u -o a.j2k -n 2");
     const FNImageReference stretched = Fn::readImage(workshop.path("a.j2k"));
     EXPECT_EQ(stretched.native(), mono8);
-    EXPECT_EQ(stretched.toMono8()(5, 3), 99) << "12 of 31";
+    EXPECT_EQ(stretched.toMono8()(5, 3), 101) << "25 of 63";
     workshop.write("two.pam", two);
     expect(std::vector<Accepted>{
         {"opj_compress -i two.pam -o a.j2k -n 2", "a.j2k", gray, mono8, intensity, 16},
         {"opj_compress -i two.pam -o a.jp2 -n 2", "a.jp2", gray, mono8, intensity, 16},
     });
 
-    // Studio colours without a matrix, the chroma at half the resolution: gray where the chroma is neutral.
-    std::string yuv;
-    for (const unsigned char v : grayPicture().span()) yuv += static_cast<char>(v);
-    yuv += std::string(2 * 7 * 5, '\x80');
-    workshop.write("a.yuv", yuv);
-    workshop.run("opj_compress -i a.yuv -F 13,9,3,8,u@1x1:2x2:2x2 -o a.jp2 -n 2 -mct 0");
+    // Full-range YCbCr, the chroma at half the resolution: gray where the chroma is neutral.
+    FNImage<unsigned char> luma(12, 8);
+    std::copy_n(picture.data(), luma.size(), luma.getExclusive());
+    workshop.write("a.yuv",
+                   std::string(luma.data(), luma.data() + luma.size()) + std::string(2 * 6 * 4, '\x80'));
+    workshop.run("opj_compress -i a.yuv -F 12,8,3,8,u@1x1:2x2:2x2 -o a.jp2 -n 2 -mct 0");
     const RecordedProperties properties;
     const FNImageReference neutral = Fn::readImage(workshop.path("a.jp2"), properties.feedback);
     EXPECT_EQ(properties.mode(), yCbCr);
-    EXPECT_EQ(largestDifference(neutral, gray), 0);
+    EXPECT_EQ(largestDifference(neutral, Factory::create(luma)), 0);
 }
 
 TEST_F(ForeignFiles, Tiff) {

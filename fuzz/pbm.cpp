@@ -1,0 +1,11 @@
+// PGM and PPM files with attributes.
+
+#include "fn/imagefile/pbm.h"
+
+#include "image_reader.h"
+
+extern "C" int LLVMFuzzerTestOneInput(const unsigned char* data, std::size_t size) {
+    return fuzzImageReader(data, size, [](std::istream& stream, const auto& feedback, const auto& limits) {
+        return Fn::readPbm(stream, feedback, limits);
+    });
+}
