@@ -66,8 +66,9 @@ SVMFPDiscriminator::SVMFPDiscriminator(std::istream& stream, const double& thres
 
 SVMFPDiscriminator SVMFPDiscriminator::create(const std::string& directory, const std::string& file,
                                               const double& threshold, const FloatLayout& layout) {
-    auto stream = Implementation::openTemplate(directory, file, "SVMFPDiscriminator");
-    return SVMFPDiscriminator(stream, threshold, layout);
+    return Implementation::readTemplate(directory, file, "SVMFPDiscriminator", [&](std::istream& stream) {
+        return SVMFPDiscriminator(stream, threshold, layout);
+    });
 }
 
 bool SVMFPDiscriminator::operator()(const Img::FeatureVector<float>& x, double& score) const {
@@ -100,8 +101,9 @@ SVMFPDiscriminatorFixed::SVMFPDiscriminatorFixed(std::istream& stream, const dou
 
 SVMFPDiscriminatorFixed SVMFPDiscriminatorFixed::create(const std::string& directory, const std::string& file,
                                                         const double& threshold) {
-    auto stream = Implementation::openTemplate(directory, file, "SVMFPDiscriminatorFixed");
-    return SVMFPDiscriminatorFixed(stream, threshold);
+    return Implementation::readTemplate(
+        directory, file, "SVMFPDiscriminatorFixed",
+        [&](std::istream& stream) { return SVMFPDiscriminatorFixed(stream, threshold); });
 }
 
 bool SVMFPDiscriminatorFixed::operator()(const Img::FeatureVector<short>& x, double& score) const {
