@@ -85,12 +85,15 @@ SVMFPDiscriminatorFixed::SVMFPDiscriminatorFixed(const FullPolynomialSvm& svm, c
     : svm_(ordered(svm)), threshold_(threshold) {
     for (const auto& vector : svm_.support.vectors) {
         float largest = 0;
-        for (const float v : vector) largest = std::max(largest, std::abs(v));
+        for (const float v : vector) {
+            if (!std::isfinite(v)) FN_THROW(FNEBadFormat, "SVMFPDiscriminatorFixed: value that is no number");
+            largest = std::max(largest, std::abs(v));
+        }
         int exponent;
         SvmDisc::getRepresentation(largest, exponent);
         FixedVector fixed{std::vector<signed char>(vector.size()), SvmDisc::ipow2(exponent) / 127};
         std::transform(vector.begin(), vector.end(), fixed.values.begin(), [&](float v) {
-            return static_cast<signed char>(std::round(v * 127 * SvmDisc::ipow2(-exponent)));
+            return static_cast<signed char>(std::round(std::ldexp(v, -exponent) * 127));
         });
         vectors_.push_back(std::move(fixed));
     }
@@ -120,7 +123,7 @@ float SvmDisc::ipow2(int exponent) {
 
 signed char SvmDisc::getRepresentation(float v, int& exponent) {
     std::frexp(v, &exponent);
-    return static_cast<signed char>(std::round(std::ldexp(v * 127, -exponent)));
+    return static_cast<signed char>(std::round(std::ldexp(v, -exponent) * 127));
 }
 
 } // namespace Eye
