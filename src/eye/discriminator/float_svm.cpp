@@ -66,8 +66,8 @@ void FullPolynomialSvm::write(std::ostream& stream) const {
 
 SVMHyperbolicDiscriminator::SVMHyperbolicDiscriminator(const std::string& directory,
                                                        const std::string& file) {
-    auto stream = Implementation::openTemplate(directory, file, "SVMHyperbolicDiscriminator");
-    read(stream);
+    Implementation::readTemplate(directory, file, "SVMHyperbolicDiscriminator",
+                                 [this](std::istream& stream) { read(stream); });
 }
 
 void SVMHyperbolicDiscriminator::read(std::istream& stream) {
@@ -107,8 +107,8 @@ bool SVMHyperbolicDiscriminator::operator()(const Img::FeatureVector<float>& x, 
 }
 
 SVMRBFDiscriminator::SVMRBFDiscriminator(const std::string& directory, const std::string& file) {
-    auto stream = Implementation::openTemplate(directory, file, "SVMRBFDiscriminator");
-    read(stream);
+    Implementation::readTemplate(directory, file, "SVMRBFDiscriminator",
+                                 [this](std::istream& stream) { read(stream); });
 }
 
 void SVMRBFDiscriminator::read(std::istream& stream) {

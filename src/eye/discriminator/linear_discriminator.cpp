@@ -36,8 +36,9 @@ LdDiscriminator::LdDiscriminator(std::istream& stream, const double& threshold, 
 
 LdDiscriminator LdDiscriminator::create(const std::string& directory, const std::string& file,
                                         const double& threshold, const FloatLayout& layout) {
-    auto stream = Implementation::openTemplate(directory, file, "LdDiscriminator");
-    return LdDiscriminator(stream, threshold, layout);
+    return Implementation::readTemplate(directory, file, "LdDiscriminator", [&](std::istream& stream) {
+        return LdDiscriminator(stream, threshold, layout);
+    });
 }
 
 void LdDiscriminator::write(std::ostream& stream) const {
@@ -51,8 +52,8 @@ bool LdDiscriminator::operator()(const Img::FeatureVector<float>& x, double& sco
 }
 
 QuadDiscriminator::QuadDiscriminator(const std::string& directory, const std::string& file) {
-    auto stream = Implementation::openTemplate(directory, file, "QuadDiscriminator");
-    read(stream);
+    Implementation::readTemplate(directory, file, "QuadDiscriminator",
+                                 [this](std::istream& stream) { read(stream); });
 }
 
 void QuadDiscriminator::read(std::istream& stream) {

@@ -66,8 +66,9 @@ SVMFPDiscriminator::SVMFPDiscriminator(std::istream& stream, const double& thres
 
 SVMFPDiscriminator SVMFPDiscriminator::create(const std::string& directory, const std::string& file,
                                               const double& threshold, const FloatLayout& layout) {
-    auto stream = Implementation::openTemplate(directory, file, "SVMFPDiscriminator");
-    return SVMFPDiscriminator(stream, threshold, layout);
+    return Implementation::readTemplate(directory, file, "SVMFPDiscriminator", [&](std::istream& stream) {
+        return SVMFPDiscriminator(stream, threshold, layout);
+    });
 }
 
 bool SVMFPDiscriminator::operator()(const Img::FeatureVector<float>& x, double& score) const {
@@ -84,12 +85,15 @@ SVMFPDiscriminatorFixed::SVMFPDiscriminatorFixed(const FullPolynomialSvm& svm, c
     : svm_(ordered(svm)), threshold_(threshold) {
     for (const auto& vector : svm_.support.vectors) {
         float largest = 0;
-        for (const float v : vector) largest = std::max(largest, std::abs(v));
+        for (const float v : vector) {
+            if (!std::isfinite(v)) FN_THROW(FNEBadFormat, "SVMFPDiscriminatorFixed: value that is no number");
+            largest = std::max(largest, std::abs(v));
+        }
         int exponent;
         SvmDisc::getRepresentation(largest, exponent);
         FixedVector fixed{std::vector<signed char>(vector.size()), SvmDisc::ipow2(exponent) / 127};
         std::transform(vector.begin(), vector.end(), fixed.values.begin(), [&](float v) {
-            return static_cast<signed char>(std::round(v * 127 * SvmDisc::ipow2(-exponent)));
+            return static_cast<signed char>(std::round(std::ldexp(v, -exponent) * 127));
         });
         vectors_.push_back(std::move(fixed));
     }
@@ -100,8 +104,9 @@ SVMFPDiscriminatorFixed::SVMFPDiscriminatorFixed(std::istream& stream, const dou
 
 SVMFPDiscriminatorFixed SVMFPDiscriminatorFixed::create(const std::string& directory, const std::string& file,
                                                         const double& threshold) {
-    auto stream = Implementation::openTemplate(directory, file, "SVMFPDiscriminatorFixed");
-    return SVMFPDiscriminatorFixed(stream, threshold);
+    return Implementation::readTemplate(
+        directory, file, "SVMFPDiscriminatorFixed",
+        [&](std::istream& stream) { return SVMFPDiscriminatorFixed(stream, threshold); });
 }
 
 bool SVMFPDiscriminatorFixed::operator()(const Img::FeatureVector<short>& x, double& score) const {
@@ -118,7 +123,7 @@ float SvmDisc::ipow2(int exponent) {
 
 signed char SvmDisc::getRepresentation(float v, int& exponent) {
     std::frexp(v, &exponent);
-    return static_cast<signed char>(std::round(std::ldexp(v * 127, -exponent)));
+    return static_cast<signed char>(std::round(std::ldexp(v, -exponent) * 127));
 }
 
 } // namespace Eye

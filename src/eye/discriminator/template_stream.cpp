@@ -108,13 +108,6 @@ template <class T> TemplateWriter& TemplateWriter::vector(const FNVector<T>& val
     return *this;
 }
 
-std::ifstream openTemplate(const std::string& directory, const std::string& file, const std::string& name) {
-    const std::string path = directory.empty() ? file : directory + "/" + file;
-    std::ifstream stream(path, std::ios::binary);
-    if (!stream) FN_THROW(FNEIOError, name + ": error opening template file `" + path + "'.");
-    return stream;
-}
-
 template FNVector<float> TemplateReader::readVector<float>(std::size_t);
 template FNVector<double> TemplateReader::readVector<double>();
 template TemplateWriter& TemplateWriter::vector(const FNVector<float>&);

@@ -52,8 +52,18 @@ private:
     std::ostream& stream_;
 };
 
-/// Opens `directory`/`file` for the discriminator of class `name`, "/" left out if `directory` is empty.
-/// @throws FNEIOError
-std::ifstream openTemplate(const std::string& directory, const std::string& file, const std::string& name);
+/// Opens `directory`/`file` for the discriminator of class `name` and hands it to `read`, whose failures get
+/// the path added. @throws FNEIOError if it cannot be opened; FNEBadFormat
+template <class Read>
+auto readTemplate(const std::string& directory, const std::string& file, const std::string& name, Read read) {
+    const std::string path = directory + "/" + file;
+    std::ifstream stream(path, std::ios::binary);
+    if (!stream) FN_THROW(FNEIOError, name + ": error opening template file `" + path + "'.");
+    try {
+        return read(stream);
+    } catch (const FNException& e) {
+        FN_THROW(FNEBadFormat, e.what() + std::string(" (`") + path + "')");
+    }
+}
 
 } // namespace Eye::Implementation
