@@ -168,22 +168,33 @@ template <class Sample, class Color> std::vector<Sample> toTriples(const FNImage
     return samples;
 }
 
+/// Codes into `bytes`. @return the number of bytes written. @throws charls::jpegls_error
+template <class Sample>
+std::size_t encodeInto(std::vector<unsigned char>& bytes, const Sample* samples, std::uint32_t w,
+                       std::uint32_t h, int components) {
+    charls::jpegls_encoder encoder;
+    encoder.frame_info({w, h, 8 * sizeof(Sample), components});
+    if (components > 1) encoder.interleave_mode(charls::interleave_mode::line);
+    bytes.resize(std::max(bytes.size(), encoder.estimated_destination_size()));
+    encoder.destination(bytes);
+    return encoder.encode(samples, std::size_t{w} * h * static_cast<unsigned>(components) * sizeof(Sample));
+}
+
 template <class Sample>
 FNRMem<unsigned char> encode(const Sample* samples, std::uint32_t w, std::uint32_t h, int components) {
-    try {
-        charls::jpegls_encoder encoder;
-        encoder.frame_info({w, h, 8 * sizeof(Sample), components});
-        if (components > 1) encoder.interleave_mode(charls::interleave_mode::line);
-        std::vector<unsigned char> bytes(encoder.estimated_destination_size());
-        encoder.destination(bytes);
-        const std::size_t written =
-            encoder.encode(samples, std::size_t{w} * h * static_cast<unsigned>(components) * sizeof(Sample));
-        FNRMem<unsigned char> result(written);
-        std::copy_n(bytes.begin(), written, result.getExclusive());
-        return result;
-    } catch (const charls::jpegls_error& error) {
-        FN_THROW(FNESysError, std::string("writeJpegLS(): ") + textOf(error));
-    }
+    // CharLS's estimate is too small for noise, whose codes are longer than its samples: at most four times.
+    constexpr int mostAttempts = 4;
+    std::vector<unsigned char> bytes;
+    for (int attempt = 1;; ++attempt) try {
+            const std::size_t written = encodeInto(bytes, samples, w, h, components);
+            FNRMem<unsigned char> result(written);
+            std::copy_n(bytes.begin(), written, result.getExclusive());
+            return result;
+        } catch (const charls::jpegls_error& error) {
+            if (error.code() != charls::jpegls_errc::destination_buffer_too_small || attempt == mostAttempts)
+                FN_THROW(FNESysError, std::string("writeJpegLS(): ") + textOf(error));
+            bytes.resize(2 * bytes.size());
+        }
 }
 
 } // namespace
