@@ -1,9 +1,10 @@
 #include "img/affine/primitives.h"
 #include "img/affine/rothstein.h"
 
-#include "every_target.h"
 #include "plain_affine.h"
 #include "random_images.h"
+#include "support/each_target.h"
+#include "support/thrown_text.h"
 
 #include <gtest/gtest.h>
 
@@ -14,15 +15,6 @@ namespace {
 using namespace Img::Affine;
 using namespace Img::Affine::Primitives;
 using Words = FNImage<unsigned short>;
-
-std::string messageOf(const std::function<void()>& action) {
-    try {
-        action();
-    } catch (const FNEBadArg& e) {
-        return e.what();
-    }
-    return "no FNEBadArg";
-}
 
 TEST(RothsteinCode, SpreadsUnitsEvenly) {
     EXPECT_EQ(imgRothsteinCode(7, 3), (std::vector<std::uint32_t>{2, 3, 2}));
@@ -41,7 +33,8 @@ TEST(RothsteinCode, SpreadsUnitsEvenly) {
         }
         EXPECT_EQ(sum, p);
     }
-    EXPECT_EQ(messageOf([] { imgRothsteinCode(2, 3); }), "imgRothsteinCode: Fatal Error: p < q: 2 3");
+    EXPECT_EQ(thrownText<FNEBadArg>([] { imgRothsteinCode(2, 3); }),
+              "imgRothsteinCode: Fatal Error: p < q: 2 3");
 }
 
 /// Random sources, boxes and factors; rows of 1 to 100 pixels end at all offsets from a vector's end.
@@ -92,7 +85,7 @@ TEST(AreaAverages, EqualTheirPlainForms) {
         {"bilinear, down", 0.1f, 4, bilinearInterpolationFixedpoint, Plain::bilinearBox},
     };
     for (const auto& c : cases)
-        onEveryTarget([&] {
+        forEachTarget([&] {
             SCOPED_TRACE(c.name);
             compareOnRandomBoxes(c.least, c.greatest, c.fast, c.slow);
         });
@@ -108,7 +101,7 @@ TEST(AreaAverages, WideSourcesChooseTheirUnitsByTheHorizontalFactor) {
     }
     const Words tooWide(512, 4);
     Words dst(2, 2);
-    EXPECT_EQ(messageOf([&] { sourceAlignedFractionalAveraging(tooWide, dst, tooWide.box()); }),
+    EXPECT_EQ(thrownText<FNEBadArg>([&] { sourceAlignedFractionalAveraging(tooWide, dst, tooWide.box()); }),
               "Img::downScale<FNUInt16, FNUInt16>: could not find a valid scale factor for requested scaling "
               "[512x4]->[2x2], requested scale factor is 256 but maximal possible is 256!");
 }
@@ -150,12 +143,12 @@ TEST(AreaAverages, RefuseBoxesOutsideAndLargeFactors) {
         for (const FNBox& box :
              {FNBox{-1, 0, 5, 5}, FNBox{0, -1, 5, 5}, FNBox{0, 0, 341, 5}, FNBox{0, 0, 5, 341}}) {
             Words dst(2, 2);
-            EXPECT_EQ(messageOf([&] { c.primitive(src, dst, box); }),
+            EXPECT_EQ(thrownText<FNEBadArg>([&] { c.primitive(src, dst, box); }),
                       std::string(c.name) + ": the given source box does not lay inside the source image!");
         }
     Words dst(20, 20);
     EXPECT_NO_THROW(destinationAlignedFractionalAveraging(src, dst, {0, 0, 320, 320}));
-    EXPECT_EQ(messageOf([&] {
+    EXPECT_EQ(thrownText<FNEBadArg>([&] {
                   destinationAlignedFractionalAveraging(src, dst, {0, 0, 340, 20});
               }),
               "Img::scaleImageFd: the scale factors 17 and 1 for scaling from 340x20 to 20x20 are too large. "
@@ -164,7 +157,7 @@ TEST(AreaAverages, RefuseBoxesOutsideAndLargeFactors) {
 
 TEST(AreaAverages, OfFloatsAreAreaMeans) {
     RandomImages random(4);
-    onEveryTarget([&] {
+    forEachTarget([&] {
         for (const auto& [w, h] : {std::pair(40u, 15u), {17u, 20u}, {10u, 5u}}) {
             const FNImage<float> src = random.image<float>(83, 41);
             const FNBox box{3, 1, 80, 41};
@@ -221,7 +214,7 @@ TEST(AreaAverages, OfColoursAreThoseOfTheirChannels) {
 
 TEST(FourToThree, EqualsItsPlainForm) {
     RandomImages random(6);
-    onEveryTarget([&] {
+    forEachTarget([&] {
         for (int w = 1; w < 40; w += w < 9 ? 1 : 5)
             for (int h = 1; h < 12; ++h) {
                 const Words src = random.image<unsigned short>(w, h);
@@ -260,10 +253,10 @@ TEST(Bilinear, FixedPointParallelogramsEqualTheirPlainForm) {
         ASSERT_EQ(dst, expected) << round;
         EXPECT_EQ(mapping(FNPos(0, 0)), origin);
         const auto strict = [&] { bilinearInterpolationFixedpoint(src, dst, origin, u, v, false, 4711); };
-        EXPECT_EQ(messageOf(strict),
+        EXPECT_EQ(thrownText<FNEBadArg>(strict),
                   outside ? "bilinearInterpolationFixedpoint: Invalid source pixels (but padding is "
                             "not allowed)!"
-                          : "no FNEBadArg");
+                          : "nothing thrown");
     }
 }
 
@@ -292,7 +285,7 @@ float floatSample(const FNImage<float>& src, double x, double y, float backgroun
 
 TEST(Bilinear, FloatsFollowTheRuleForNeighboursOutside) {
     RandomImages random(8);
-    onEveryTarget([&] {
+    forEachTarget([&] {
         for (int round = 0; round < 60; ++round) {
             const FNImage<float> src = random.image<float>(random.number(1, 30), random.number(1, 30));
             // Multiples of 2^-8, and sizes that are powers of two: positions are exact, so no sample is near
@@ -314,7 +307,7 @@ TEST(Bilinear, FloatsFollowTheRuleForNeighboursOutside) {
     });
     const FNImage<float> src = random.image<float>(4, 4);
     FNImage<float> dst(4, 4);
-    EXPECT_EQ(messageOf([&] {
+    EXPECT_EQ(thrownText<FNEBadArg>([&] {
                   bilinearInterpolation(src, dst, {-3, 0}, {4, 0}, {0, 4}, false, 0);
               }),
               "DoBilinearInterpolation: Invalid source pixels (but padding is not allowed)!");

@@ -1,7 +1,8 @@
 #include "img/fft/img_fft.h"
 
-#include "every_target.h"
 #include "random_images.h"
+#include "support/each_target.h"
+#include "support/thrown_text.h"
 
 #include <gtest/gtest.h>
 
@@ -68,7 +69,7 @@ TEST(FloatFft, OfAnySizeIsTheDirectTransform) {
     const std::pair<int, int> sizes[] = {{2, 2},  {64, 16},  {3, 5},   {160, 160}, {108, 80},
                                          {7, 49}, {12, 100}, {33, 35}, {13, 22},   {31, 17},
                                          {37, 6}, {82, 3},   {2, 101}, {1 << 9, 2}};
-    onEveryTarget([&] {
+    forEachTarget([&] {
         for (const auto& [w, h] : sizes) {
             SCOPED_TRACE(testing::Message() << w << "x" << h);
             const ImgFFTFloat fft(static_cast<unsigned>(w), static_cast<unsigned>(h));
@@ -97,7 +98,7 @@ PixelBlockRanges randomRanges(RandomImages& random, std::uint32_t size) {
 
 TEST(FloatFft, OfSparseImagesEqualsThatOfTheFullOnes) {
     RandomImages random(2);
-    onEveryTarget([&] {
+    forEachTarget([&] {
         for (int round = 0; round < 20; ++round) {
             const unsigned w = round % 2 ? 80 : 45, h = round % 4 < 2 ? 64 : 27;
             const ImgFFTFloat fft(w, h);
@@ -136,7 +137,7 @@ TEST(FloatFft, OfSparseImagesEqualsThatOfTheFullOnes) {
 
 TEST(FixedPointFft, IsTheDirectTransformScaledDown) {
     RandomImages random(3);
-    onEveryTarget([&] {
+    forEachTarget([&] {
         for (const auto& [w, h] : {std::pair(16, 16), {64, 8}, {80, 96}, {108, 108}, {160, 80}, {11, 26}}) {
             SCOPED_TRACE(testing::Message() << w << "x" << h);
             const ImgFFTInt fft(static_cast<unsigned>(w), static_cast<unsigned>(h));
@@ -159,7 +160,7 @@ TEST(FixedPointFft, IsTheDirectTransformScaledDown) {
 }
 
 TEST(FixedPointFft, DoesNotOverflow) {
-    onEveryTarget([] {
+    forEachTarget([] {
         for (const int value : {std::numeric_limits<int>::min(), std::numeric_limits<int>::max()})
             for (const unsigned size : {16u, 160u, 108u}) {
                 const ImgFFTInt fft(size, size);
@@ -181,39 +182,31 @@ TEST(FixedPointFft, DoesNotOverflow) {
     });
 }
 
-std::string messageOf(const std::function<void()>& action) {
-    try {
-        action();
-    } catch (const FNEBadArg& e) {
-        return e.what();
-    }
-    return "no FNEBadArg";
-}
-
 TEST(Fft, RefusesWrongSizes) {
     const FNImage<float> real(5, 5);
     const Complex<float> complex(5, 5);
     const ImgFFTFloat radix2(8, 8), mixed(6, 8);
     const auto t = radix2.create();
-    EXPECT_EQ(messageOf([&] { radix2.transformReal(real, t); }),
+    EXPECT_EQ(thrownText<FNEBadArg>([&] { radix2.transformReal(real, t); }),
               "imgFFT<float,IPP>::transformReal: invalid image sizes");
-    EXPECT_EQ(messageOf([&] { radix2.inverse(complex, t); }), "imgFFT::inverse: invalid image sizes");
-    EXPECT_EQ(messageOf([&] { mixed.transformReal(real, t); }),
+    EXPECT_EQ(thrownText<FNEBadArg>([&] { radix2.inverse(complex, t); }),
+              "imgFFT::inverse: invalid image sizes");
+    EXPECT_EQ(thrownText<FNEBadArg>([&] { mixed.transformReal(real, t); }),
               "ImgFFT<float,MKL>::transformReal: invalid image sizes");
-    EXPECT_EQ(messageOf([&] { mixed.transformComplex(complex, t); }),
+    EXPECT_EQ(thrownText<FNEBadArg>([&] { mixed.transformComplex(complex, t); }),
               "ImgFFT<float,MKL>::transformComplex: invalid image sizes");
-    EXPECT_EQ(messageOf([&] { mixed.inverse(complex, t); }),
+    EXPECT_EQ(thrownText<FNEBadArg>([&] { mixed.inverse(complex, t); }),
               "ImgFFT<float,MKL>::inverse: invalid image sizes");
     const ImgFFTInt fixed(16, 16);
-    EXPECT_EQ(messageOf([&] { fixed.transformReal(FNImage<int>(5, 5), fixed.create()); }),
+    EXPECT_EQ(thrownText<FNEBadArg>([&] { fixed.transformReal(FNImage<int>(5, 5), fixed.create()); }),
               "imgFFT::transform: invalid image sizes");
-    EXPECT_EQ(messageOf([] { ImgFFTInt(7, 12); }), "imgFFT::constructor: invalid image sizes");
-    EXPECT_EQ(messageOf([] { ImgFFTInt(80, 74); }),
+    EXPECT_EQ(thrownText<FNEBadArg>([] { ImgFFTInt(7, 12); }), "imgFFT::constructor: invalid image sizes");
+    EXPECT_EQ(thrownText<FNEBadArg>([] { ImgFFTInt(80, 74); }),
               "The generated FFT mixed radix rotation factors are not available for this configation!");
     for (const unsigned size : {0u, 1u})
-        EXPECT_EQ(messageOf([&] { ImgFFTFloat(8, size); }),
+        EXPECT_EQ(thrownText<FNEBadArg>([&] { ImgFFTFloat(8, size); }),
                   "FFT::FFT: At least 2 points must be given for transforms");
-    EXPECT_EQ(messageOf([] { ImgFFTImplementations::IPPRadix2<float>(8, 6); }),
+    EXPECT_EQ(thrownText<FNEBadArg>([] { ImgFFTImplementations::IPPRadix2<float>(8, 6); }),
               "ImgFFT<float, IPPRadix2>::ImgFFT(unsigned int,unsigned int): Image dimensions have to be "
               "exact powers "
               "of two !");

@@ -2,9 +2,11 @@
 #include "img/local_equalization.h"
 
 #include "random_images.h"
+#include "support/thrown_text.h"
 
 #include <gtest/gtest.h>
 
+#include <array>
 #include <cmath>
 
 namespace {
@@ -28,12 +30,8 @@ TEST(HistogramEqualizer, MapsValuesToTheirRank) {
     EXPECT_FLOAT_EQ(ofTwo(2), 1.0f / 3);
     EXPECT_EQ(ofNone(0.7f), 0.7f);
     EXPECT_EQ(HistogramEqualizer<float>(image, {0, 0, 1, 1}, 0, 1)(4), 0) << "a single pixel has rank 0";
-    try {
-        HistogramEqualizer<float>(image, image.box(), 2, 2);
-        FAIL();
-    } catch (const FNEBadArg& e) {
-        EXPECT_STREQ(e.what(), "HistogramEqualizer:  max has to be larger than min: ( min: 2, max: 2)");
-    }
+    EXPECT_EQ(thrownText<FNEBadArg>([&] { HistogramEqualizer<float>(image, image.box(), 2, 2); }),
+              "HistogramEqualizer:  max has to be larger than min: ( min: 2, max: 2)");
 }
 
 TEST(HistogramEqualizer, MapsAConstantImageToTheMiddle) {
@@ -112,17 +110,9 @@ TEST(NearlyRegularGrid, EndsWithTheImage) {
     EXPECT_EQ(grid.corner(4, 0), FNGridPos(32, 0));
     EXPECT_EQ(grid.box(5, 0), (FNBox{34, 0, 50, 16}));
     EXPECT_EQ(NearlyRegularGrid<float>(image, 17, 1, 16, 16).nx(), 3) << "the last one is regular";
-    const auto message = [&](int dx, int tileWidth, int tileHeight) -> std::string {
-        try {
-            NearlyRegularGrid<float>(image, dx, 8, tileWidth, tileHeight);
-        } catch (const FNEBadArg& e) {
-            return e.what();
-        }
-        return "";
-    };
-    for (const auto& [dx, tw, th] :
-         {std::array{0, 16, 16}, {8, 0, 16}, {8, 51, 16}, {8, 16, 17}, {8, 16, -1}})
-        EXPECT_EQ(message(dx, tw, th), "NearlyRegularGrid: invalid parameters");
+    for (const auto& c : {std::array{0, 16, 16}, {8, 0, 16}, {8, 51, 16}, {8, 16, 17}, {8, 16, -1}})
+        EXPECT_EQ(thrownText<FNEBadArg>([&] { NearlyRegularGrid<float>(image, c[0], 8, c[1], c[2]); }),
+                  "NearlyRegularGrid: invalid parameters");
 }
 
 /// Tile and weight of the second tile along one axis, from the definition.

@@ -2,6 +2,7 @@
 #include "img/scaling_table.h"
 
 #include "random_images.h"
+#include "support/thrown_text.h"
 
 #include <gtest/gtest.h>
 
@@ -46,12 +47,8 @@ TEST(ScalingTable, RefusesWrongParameters) {
     for (const auto& c : cases)
         EXPECT_THROW(Img::createScalingTable(c[0], c[1], c[2], c[3], c[4], true), FNEBadArg)
             << c[1] << " " << c[4];
-    try {
-        Img::createScalingTable(7, 0.5, 1, 2, 0.25, true);
-        FAIL();
-    } catch (const FNEBadArg& e) {
-        EXPECT_STREQ(e.what(), "Img::createScalingTable parameter error: 7, 0.5, 0.25, 1, 2");
-    }
+    EXPECT_EQ(thrownText<FNEBadArg>([&] { Img::createScalingTable(7, 0.5, 1, 2, 0.25, true); }),
+              "Img::createScalingTable parameter error: 7, 0.5, 0.25, 1, 2");
 }
 
 TEST(Pyramid, MakesEachLevelFromTheSource) {

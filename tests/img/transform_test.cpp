@@ -2,6 +2,7 @@
 #include "img/affine/transform.h"
 
 #include "random_images.h"
+#include "support/thrown_text.h"
 
 #include <gtest/gtest.h>
 
@@ -201,12 +202,22 @@ TEST(CutOut, FillsWhatLiesOutside) {
         EXPECT_THROW(transform(src, dst, {-side / 2, 4}, {side, 0}, {0, side / 3}, false, 100), FNEBadArg);
     }
     Words dst(8, 8);
-    try {
-        transform(src, dst, {100, 100}, {80, 0}, {0, 80}, false, 0);
-        FAIL();
-    } catch (const FNEBadArg& e) {
-        EXPECT_STREQ(e.what(), "transform: padding required for this transformation but not allowed!");
-    }
+    EXPECT_EQ(thrownText<FNEBadArg>([&] {
+                  transform(src, dst, {100, 100}, {80, 0}, {0, 80}, false, 0);
+              }),
+              "transform: padding required for this transformation but not allowed!");
+}
+
+TEST(CutOut, OfColoursIsOpaque) {
+    RandomImages random(5);
+    const Color src = random.image<Fn::Bgra32>(40, 40); // of any alpha
+    for (const float side : {6.0f, 12.0f, 80.0f})
+        for (const float x : {-4.0f, 100.0f}) { // partly and wholly outside
+            Color dst(8, 8);
+            transform(src, dst, {x, 5}, {side, 1}, {-1, side}, true, Fn::Bgra32(1, 2, 3, 4));
+            for (std::uint64_t i = 0; i < dst.size(); ++i)
+                ASSERT_EQ(dst.data()[i].a, 255) << side << " " << x;
+        }
 }
 
 TEST(CutOut, RefusesWhatCannotBeSampled) {

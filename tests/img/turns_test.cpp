@@ -3,6 +3,7 @@
 #include "img/affine/turns.h"
 
 #include "random_images.h"
+#include "support/thrown_text.h"
 
 #include <gtest/gtest.h>
 
@@ -98,19 +99,11 @@ TEST(Perspective, MapsCornersOntoCorners) {
 
 TEST(Perspective, RefusesDegenerateFigures) {
     FN3Matrix<float> T;
-    const auto message = [](const auto& action) -> std::string {
-        try {
-            action();
-        } catch (const FNEBadArg& e) {
-            return e.what();
-        }
-        return "";
-    };
-    EXPECT_EQ(message([&] {
+    EXPECT_EQ(thrownText<FNEBadArg>([&] {
                   MapSquareQuad({0, 0}, {1, 1}, {2, 2}, {4, 4}, T);
               }),
               "MapSquareQuad: Bad Mapping!");
-    EXPECT_EQ(message([&] {
+    EXPECT_EQ(thrownText<FNEBadArg>([&] {
                   MapRectQuad({1, 1}, {1, 5}, {0, 0}, {1, 0}, {1, 1}, {0, 1}, T);
               }),
               "MapRectQuad: Bad Mapping! Null Rectangle.");

@@ -216,7 +216,8 @@ Mapping transform(const FNImage<float>& src, FNImage<float>& dst, FNPos origin, 
 }
 Mapping transform(const FNImage<Fn::Bgra32>& src, FNImage<Fn::Bgra32>& dst, FNPos origin, FN2Vector<float> u,
                   FN2Vector<float> v, bool const& useBackground, Fn::Bgra32 const& background) {
-    return CutOut(src, dst, origin, u, v, useBackground, background)();
+    const Fn::Bgra32 opaque(background.r, background.g, background.b);
+    return CutOut(src, dst, origin, u, v, useBackground, opaque)();
 }
 
 } // namespace Img::Affine
