@@ -92,7 +92,7 @@ template <class To, class From> constexpr To convertPixel(const From& p) {
     }
 }
 
-/// Converts `n` pixels, as convertPixel() does one by one.
+/// Converts `n` pixels, as convertPixel() does one by one; with the vector units where that is worth it.
 template <class To, class From> void convertPixels(const From* from, To* to, std::uint64_t n);
 
 /// Converts a whole image; one of the same type is returned as it is, sharing its pixels.

@@ -1,8 +1,11 @@
 #include "fn/image_conversion.h"
+#include "support/each_target.h"
 
 #include <gtest/gtest.h>
 
 #include <cmath>
+#include <random>
+#include <vector>
 
 namespace {
 
@@ -72,6 +75,51 @@ TEST(Conversion, RealsOutsideOfTheRangeAreClipped) {
         EXPECT_EQ(convertPixel<Byte>(c.real), c.byte) << c.real;
         EXPECT_EQ(convertPixel<Word>(c.real), c.word) << c.real;
     }
+}
+
+/// Samples of all kinds: the ends of the range, and reals outside of it.
+template <class T> T randomPixel(std::mt19937& random) {
+    if constexpr (std::is_same_v<T, float>) {
+        const float special[] = {
+            0, 1, -1, 1.5f, std::nanf(""), 1e30f, -1e30f, std::numeric_limits<float>::infinity()};
+        const unsigned n = random();
+        return n % 8 == 0 ? special[n / 8 % 8] : static_cast<float>(random()) * 0x1p-32f;
+    } else if constexpr (Fn::isColorPixel<T>) {
+        using Sample = typename Fn::SampleOf<T>::Type;
+        T p(randomPixel<Sample>(random), randomPixel<Sample>(random), randomPixel<Sample>(random));
+        if constexpr (std::is_same_v<T, Bgra32>) p.a = randomPixel<Byte>(random);
+        return p;
+    } else {
+        return random() % 4 ? static_cast<T>(random()) : random() % 2 ? std::numeric_limits<T>::max() : T{0};
+    }
+}
+
+/// Whole rows against one pixel after the other, at every length up to a few vectors and from odd places.
+template <class From, class To> void expectRowLikePixels() {
+    std::mt19937 random(7);
+    const std::size_t lengths[] = {0, 1, 2, 3, 5, 7, 8, 15, 16, 17, 31, 33, 63, 64, 65, 100, 127, 129, 1001};
+    for (const std::size_t n : lengths) {
+        std::vector<From> from(n + 1);
+        for (From& p : from) p = randomPixel<From>(random);
+        std::vector<To> to(n + 2, convertPixel<To>(Byte{77})), expected = to;
+        Fn::convertPixels(from.data() + 1, to.data() + 1, n);
+        for (std::size_t i = 0; i < n; ++i) expected[i + 1] = convertPixel<To>(from[i + 1]);
+        EXPECT_EQ(to, expected) << n;
+    }
+}
+
+template <class From, class... To> void expectRowsLikePixels() {
+    (expectRowLikePixels<From, To>(), ...);
+}
+
+TEST(Conversion, RowsAreConvertedLikeSinglePixelsOnEveryInstructionSet) {
+    forEachTarget([] {
+        expectRowsLikePixels<Byte, Word, float, Bgra32, Rgb48>();
+        expectRowsLikePixels<Word, Byte, float, Bgra32, Rgb48>();
+        expectRowsLikePixels<float, Byte, Word, Bgra32, Rgb48>();
+        expectRowsLikePixels<Bgra32, Byte, Word, float, Rgb48>();
+        expectRowsLikePixels<Rgb48, Byte, Word, float, Bgra32>();
+    });
 }
 
 } // namespace
