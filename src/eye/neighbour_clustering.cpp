@@ -102,11 +102,11 @@ std::vector<std::size_t> NeighbourClustering<Item, Result>::rootsOfItems() const
         for (std::size_t second = first + 1; second < byX.size(); ++second) {
             const Item& b = items_[byX[second]];
             if (b.pos.x - a.pos.x > reachPerSize * sizeOf(a)) break;
-            const auto [smaller, larger] = std::minmax(sizeOf(a), sizeOf(b));
+            const auto [smaller, larger] = std::minmax({sizeOf(a), sizeOf(b)});
             const FNPos step = b.pos - a.pos;
             const float mean = (smaller + larger) / 2;
             if (larger > mostSizeRatio * smaller || dot(step, step) > threshold * mean * mean) continue;
-            const auto [low, high] = std::minmax(root(byX[first]), root(byX[second]));
+            const auto [low, high] = std::minmax({root(byX[first]), root(byX[second])});
             parent[high] = low;
         }
     }

@@ -187,7 +187,8 @@ template <class T> typename ScalarProduct<T>::Type Vector<T>::operator*(const Ve
     if (size() != other.size()) FN_THROW(FNEBadArg, scalarProductMismatch<T>(size(), other.size()));
     const T *const a = get(), *const b = other.get();
     if constexpr (isComplex<T>) {
-        T result;
+        T result{};
+        if (empty()) return result;
         Numeric::Blas<decltype(T::re)>::dotc(size(), &a->re, &b->re, &result.re);
         return result;
     } else if constexpr (std::floating_point<T>) {

@@ -22,7 +22,7 @@ bool overlap(const Location& accepted, const Location& candidate) {
     const float distance = length(step);
     if (distance < 1.0f) return true;
     const auto [smaller, larger] =
-        std::minmax(radius(accepted, step / distance), radius(candidate, step / distance));
+        std::minmax({radius(accepted, step / distance), radius(candidate, step / distance)});
     return larger + 0.5 * smaller > distance;
 }
 

@@ -185,7 +185,8 @@ FNRMem<unsigned char> encode(const Sample* samples, std::uint32_t w, std::uint32
     // CharLS's estimate is too small for noise, whose codes are longer than its samples: at most four times.
     constexpr int mostAttempts = 4;
     std::vector<unsigned char> bytes;
-    for (int attempt = 1;; ++attempt) try {
+    for (int attempt = 1;; ++attempt) {
+        try {
             const std::size_t written = encodeInto(bytes, samples, w, h, components);
             FNRMem<unsigned char> result(written);
             std::copy_n(bytes.begin(), written, result.getExclusive());
@@ -193,8 +194,9 @@ FNRMem<unsigned char> encode(const Sample* samples, std::uint32_t w, std::uint32
         } catch (const charls::jpegls_error& error) {
             if (error.code() != charls::jpegls_errc::destination_buffer_too_small || attempt == mostAttempts)
                 FN_THROW(FNESysError, std::string("writeJpegLS(): ") + textOf(error));
-            bytes.resize(2 * bytes.size());
         }
+        bytes.resize(2 * bytes.size());
+    }
 }
 
 } // namespace

@@ -18,6 +18,7 @@ namespace Fn::Numeric {
 template <class T> inline constexpr std::size_t storedSize = sizeof(T);
 
 template <class T> void storeElements(const T* values, unsigned char* stored, std::size_t n) {
+    if (n == 0) return; // there may be no memory at all
     if constexpr (std::is_same_v<T, float>)
         htonf(values, stored, n);
     else if constexpr (std::is_same_v<T, double>)
@@ -45,6 +46,7 @@ template <class T> void storeElements(const T* values, unsigned char* stored, st
 }
 
 template <class T> void loadElements(const unsigned char* stored, T* values, std::size_t n) {
+    if (n == 0) return;
     if constexpr (std::is_same_v<T, float>)
         ntohf(stored, values, n);
     else if constexpr (std::is_same_v<T, double>)

@@ -1,0 +1,37 @@
+#pragma once
+
+#include "fn/image.h"
+#include "labelled/labels.h"
+#include "train/sign_matrix.h"
+
+#include <filesystem>
+#include <vector>
+
+namespace Train {
+
+/// A picture with one labelled face.
+struct FacePicture {
+    FNImage<unsigned short> image;
+    FNPos leftEye, rightEye;
+};
+
+/// All faces of one split in the face folders below `data`, and the pictures without a face.
+std::vector<FacePicture> loadFaces(const std::filesystem::path& data, Labelled::Split split, std::size_t most,
+                                   Random& random);
+std::vector<FNImage<unsigned short>> loadBackgrounds(const std::filesystem::path& data,
+                                                     Labelled::Split split);
+
+/// How a training patch deviates from the labelled face.
+struct Jitter {
+    float rotation;       ///< of the face in the patch, radians: the middle
+    float rotationSpread; ///< uniform up to this much either way
+    float position;       ///< uniform up to this many patch pixels either way
+    float scale;          ///< uniform in the logarithm up to this factor - 1 either way
+};
+
+/// A square patch around a face, as the finder would see it.
+/// @param pixels side of the patch @param eyeDistance in patch pixels
+FNImage<unsigned short> facePatch(const FacePicture& face, std::uint32_t pixels, float eyeDistance,
+                                  const Jitter& jitter, Random& random);
+
+} // namespace Train

@@ -1,0 +1,394 @@
+#include "train/face_training.h"
+
+#include "eye/cara/combined_cascade.h"
+#include "eye/cara/face_finder.h"
+#include "eye/cara/face_pyramid.h"
+#include "eye/cara/sod_image.h"
+#include "eye/gabor/window_convolver.h"
+#include "eye/neighbour_clustering.h"
+#include "fn/deployment/app_config_db.h"
+#include "fn/image_reference.h"
+#include "fn/image_representation.h"
+#include "img/scaling_table.h"
+#include "train/discriminator_training.h"
+#include "train/face_samples.h"
+#include "train/working_point.h"
+
+#include <cmath>
+#include <cstdio>
+#include <fstream>
+#include <functional>
+#include <memory>
+
+namespace Train {
+namespace {
+
+using namespace Eye::Cara;
+using Eye::Implementation::CascadeSettings;
+using Eye::Implementation::SodImage;
+using Eye::Implementation::TrainedSvm;
+using Image = FNImage<unsigned short>;
+using WindowConvolver =
+    Impl::FastSpatialGaborConvolver<unsigned short, int, Impl::SpatialGaborConvolverSettings_T8>;
+using FinalConvolver =
+    Impl::FastSpatialGaborConvolver<unsigned short, int, Impl::SpatialGaborConvolverSettings_T8_FinalDecider>;
+
+constexpr float windowEyeDistance = 7, finalEyeDistance = 10;
+constexpr std::uint32_t windowPixels = 17, finalPixels = 23;
+
+/// The window's scale is at most the root of 4/3 off, and its place half a pixel.
+constexpr float windowScale = 0.13f, windowShift = 0.55f;
+
+/// The working points of the configuration; what share of faces passes each.
+struct Rotation {
+    const char* name;
+    float angle;
+    std::vector<WorkingStep> disc1B, disc1C, disc2A;
+};
+
+const std::vector<WorkingStep> disc1ASteps = {{1, -1.9, 0.999}, {2, -0.6, 0.998}};
+const std::vector<WorkingStep> disc3ASteps = {{200, -0.4, 0.985}};
+const Rotation rotations[] = {
+    {"l",
+     -0.23f,
+     {{1, -2.1, 0.999}, {2, -0.47, 0.998}, {6, 0.18, 0.995}},
+     {{15, -0.82, 0.995}, {40, -0.56, 0.992}, {300, 0.38, 0.985}},
+     {{200, -0.18, 0.975}}},
+    {"c",
+     0.0f,
+     {{1, -2.0, 0.999}, {2, -0.5, 0.998}, {6, 0.22, 0.995}},
+     {{15, -0.78, 0.995}, {40, -0.55, 0.992}, {300, 0.36, 0.985}},
+     {{200, -0.23, 0.975}}},
+    {"r",
+     0.23f,
+     {{1, -2.15, 0.999}, {2, -0.55, 0.998}, {6, 0.12, 0.995}},
+     {{15, -0.72, 0.995}, {40, -0.56, 0.992}, {300, 0.32, 0.985}},
+     {{200, -0.21, 0.975}}},
+};
+constexpr float rotationSpread = 0.16f;
+
+CascadeSettings settingsOf(const std::string& file, const std::vector<WorkingStep>& steps) {
+    CascadeSettings settings{file, {}};
+    for (const WorkingStep& step : steps)
+        settings.cascade.push_back({std::to_string(step.vectors), static_cast<float>(step.threshold)});
+    return settings;
+}
+
+void save(const TrainedSvm& svm, const std::filesystem::path& file) {
+    std::ofstream stream(file, std::ios::binary);
+    if (!stream) FN_THROW(FNEIOError, "Cannot write " + file.string());
+    svm.write(stream);
+    std::printf("%s: %zu vectors\n", file.filename().c_str(), svm.supportVectors.size());
+    std::fflush(stdout);
+}
+
+/// A level of a picture with its border, as the finder scans it.
+struct ScannedLevel {
+    Img::ScaledImage<unsigned short> bordered;
+    SodImage sods;
+    float eyeDistance;
+};
+
+template <class Visit> void forEachLevel(const Image& image, Visit visit) {
+    constexpr double scaleStepRoot = 1.154700538379;
+    const double largest = std::max(2.0, image.w() * 0.5);
+    const std::list<float> scales = Img::createScalingTable(
+        windowEyeDistance, scaleStepRoot, windowEyeDistance, std::max(largest, 8.0), 0.0, true);
+    const T8::Pyramid pyramid(image, scales.front(), scales.size());
+    for (const auto& level : pyramid) {
+        const auto bordered = T8::addBorder(level, FaceFinder::everywhere);
+        visit(ScannedLevel{bordered, SodImage(bordered.image),
+                           windowEyeDistance * averageEffectiveFactor(level)});
+    }
+}
+
+Image mirrored(const Image& image) {
+    Image result(image.w(), image.h());
+    unsigned short* out = result.getExclusive();
+    for (std::uint32_t y = 0; y < image.h(); ++y, out += image.w())
+        std::reverse_copy(image.row(y), image.row(y) + image.w(), out);
+    return result;
+}
+
+/// Collects a random sample of bounded size (reservoir sampling, Vitter 1985).
+class Reservoir {
+public:
+    Reservoir(std::size_t most, Random& random) : most_(most), random_(random) {}
+
+    template <class Make> void offer(Make make) {
+        ++seen_;
+        if (vectors_.size() < most_) {
+            vectors_.push_back(make());
+        } else if (const std::size_t at = random_() % seen_; at < most_) {
+            vectors_[at] = make();
+        }
+    }
+    std::size_t seen() const { return seen_; }
+    const std::vector<Signs>& vectors() const { return vectors_; }
+
+private:
+    std::size_t most_, seen_ = 0;
+    Random& random_;
+    std::vector<Signs> vectors_;
+};
+
+class FaceTraining {
+public:
+    FaceTraining(const std::filesystem::path& data, const std::filesystem::path& out, std::uint64_t seed)
+        : data_(data), out_(out), random_(seed) {}
+
+    void run() {
+        constexpr std::size_t mostFaces = 12000, mostDevFaces = 3000;
+        faces_ = loadFaces(data_, Labelled::Split::train, mostFaces, random_);
+        devFaces_ = loadFaces(data_, Labelled::Split::dev, mostDevFaces, random_);
+        backgrounds_ = loadBackgrounds(data_, Labelled::Split::train);
+        for (std::size_t i = 0, n = backgrounds_.size(); i < n; ++i)
+            backgrounds_.push_back(mirrored(backgrounds_[i]));
+        std::printf("%zu faces to learn from, %zu to set working points, %zu pictures without faces\n",
+                    faces_.size(), devFaces_.size(), backgrounds_.size());
+        trainFirst();
+        for (const Rotation& rotation : rotations) trainRotation(rotation);
+        trainFinal();
+    }
+
+private:
+    using Accept = std::function<bool(const Signs& window)>;
+
+    std::vector<Signs> sods(const std::vector<FacePicture>& faces, const Jitter& jitter, int copies) {
+        std::vector<Signs> vectors;
+        for (int copy = 0; copy < copies; ++copy)
+            for (const FacePicture& face : faces)
+                vectors.push_back(SodImage(facePatch(face, windowPixels, windowEyeDistance, jitter, random_))
+                                      .trainedWindow(0, 0));
+        return vectors;
+    }
+
+    /// Windows of the pictures without faces that pass `accept`, in trained order.
+    std::vector<Signs> mineSods(std::size_t most, std::size_t skip, const Accept& accept) {
+        Reservoir reservoir(most, random_);
+        Signs window(SodImage::windowBits);
+        unsigned char* const bytes = window.exclusiveBytes();
+        std::size_t visited = 0;
+        for (const Image& image : backgrounds_)
+            forEachLevel(image, [&](const ScannedLevel& level) {
+                for (std::uint32_t y = 0; y < level.sods.gridHeight(); ++y)
+                    for (std::uint32_t x = 0; x < level.sods.gridWidth(); ++x) {
+                        if (skip > 1 && random_() % skip != 0) continue;
+                        ++visited;
+                        level.sods.getWindow(x, y, bytes);
+                        if (accept(window)) reservoir.offer([&] { return level.sods.trainedWindow(x, y); });
+                    }
+            });
+        std::printf("  %zu of %zu background windows pass (%.4f %%), %zu are kept\n", reservoir.seen(),
+                    visited, 100.0 * static_cast<double>(reservoir.seen()) / static_cast<double>(visited),
+                    reservoir.vectors().size());
+        return reservoir.vectors();
+    }
+
+    static SignSet join(const std::vector<Signs>& faces, const std::vector<Signs>& others) {
+        SignSet set;
+        for (const Signs& vector : faces) set.add(vector, true);
+        for (const Signs& vector : others) set.add(vector, false);
+        return set;
+    }
+
+    void trainFirst() {
+        const Jitter jitter{0, 0.36f, windowShift, windowScale};
+        const SignSet set =
+            join(sods(faces_, jitter, 2), mineSods(60000, 40, [](const Signs&) { return true; }));
+        TrainedSvm svm = trainDot(set, 2, random_);
+        setWorkingPoint(svm, sods(devFaces_, jitter, 2), disc1ASteps);
+        save(svm, out_ / "is1717da.dat");
+        first_ = std::make_unique<T8::SodDotDiscriminator>(svm, settingsOf("is1717da.dat", disc1ASteps));
+    }
+
+    void trainRotation(const Rotation& rotation) {
+        const std::string name = rotation.name;
+        const Jitter jitter{rotation.angle, rotationSpread, windowShift, windowScale};
+        const std::vector<Signs> faces = sods(faces_, jitter, 2), devFaces = sods(devFaces_, jitter, 2);
+        float score;
+
+        const Accept passesA = [&](const Signs& window) { return (*first_)(window, score); };
+        TrainedSvm svmB = trainDot(join(faces, mineSods(60000, 8, passesA)), 6, random_);
+        setWorkingPoint(svmB, devFaces, rotation.disc1B);
+        save(svmB, out_ / ("is1717d" + name + ".dat"));
+        const T8::SodDotDiscriminator discB(svmB, settingsOf("B", rotation.disc1B));
+
+        const Accept passesB = [&](const Signs& window) { return passesA(window) && discB(window, score); };
+        std::vector<Signs> others = mineSods(30000, 2, passesB);
+        TrainedSvm svmC = trainC(rotation, faces, devFaces, others);
+        // A second round against what the first one lets through.
+        const T8::SodPolynomialDiscriminator firstC(svmC, settingsOf("C", rotation.disc1C));
+        const Accept passesC = [&](const Signs& window) { return passesB(window) && firstC(window, score); };
+        const std::vector<Signs> hard = mineSods(20000, 1, passesC);
+        others.insert(others.end(), hard.begin(), hard.end());
+        svmC = trainC(rotation, faces, devFaces, others);
+        save(svmC, out_ / ("is1717f" + name + ".dat"));
+        const T8::SodPolynomialDiscriminator discC(svmC, settingsOf("C", rotation.disc1C));
+
+        const Accept passesAll = [&](const Signs& window) { return passesB(window) && discC(window, score); };
+        TrainedSvm svm2 = growPolynomial(join(gaborSigns(faces_, jitter, 2), mineGabor(20000, passesAll)),
+                                         {{200}, 0.1f}, random_);
+        setWorkingPoint(svm2, gaborSigns(devFaces_, jitter, 2), rotation.disc2A);
+        save(svm2, out_ / ("gs1717f" + name + ".dat"));
+        collectCandidates(rotation, passesAll,
+                          T8::GaborDiscriminator(svm2, settingsOf("2A", rotation.disc2A)));
+    }
+
+    /// Keeps what passes all stages of a rotation on background, as the final test will see it.
+    void collectCandidates(const Rotation& rotation, const Accept& accept,
+                           const T8::GaborDiscriminator& last) {
+        const WindowConvolver convolver;
+        Signs window(SodImage::windowBits);
+        unsigned char* const bytes = window.exclusiveBytes();
+        std::size_t before = candidates_.seen();
+        float score;
+        for (const Image& image : backgrounds_)
+            forEachLevel(image, [&](const ScannedLevel& level) {
+                for (std::uint32_t y = 0; y < level.sods.gridHeight(); ++y)
+                    for (std::uint32_t x = 0; x < level.sods.gridWidth(); ++x) {
+                        level.sods.getWindow(x, y, bytes);
+                        const FNGridPos at{static_cast<std::int32_t>(x), static_cast<std::int32_t>(y)};
+                        if (!accept(window) || !last(convolver.getGaborSODs(level.bordered.image, at), score))
+                            continue;
+                        const FNPos centre = level.bordered.mapping(
+                            {static_cast<float>(x) + 8.5f, static_cast<float>(y) + 8.5f});
+                        candidates_.offer(
+                            [&] { return finalSigns(image, centre, level.eyeDistance, rotation.angle); });
+                    }
+            });
+        std::printf("  %zu background windows reach the final test\n", candidates_.seen() - before);
+    }
+
+    Signs finalSigns(const Image& image, FNPos centre, float eyeDistance, float angle) const {
+        const float side = eyeDistance * static_cast<float>(finalPixels) / finalEyeDistance;
+        const FNPos u = FNPos{std::cos(angle), std::sin(angle)} * side, v{-u.y, u.x};
+        Image patch(finalPixels, finalPixels);
+        Img::Affine::transform(image, patch, centre - u / 2.0f - v / 2.0f, u, v, true, 0);
+        return finalConvolver_.getGaborSODs(patch, {0, 0});
+    }
+
+    TrainedSvm trainC(const Rotation& rotation, const std::vector<Signs>& faces,
+                      const std::vector<Signs>& devFaces, const std::vector<Signs>& others) {
+        TrainedSvm svm = growPolynomial(join(faces, others), {{15, 40, 300}, 0.1f}, random_);
+        setWorkingPoint(svm, devFaces, rotation.disc1C);
+        return svm;
+    }
+
+    std::vector<Signs> gaborSigns(const std::vector<FacePicture>& faces, const Jitter& jitter, int copies) {
+        const WindowConvolver convolver;
+        std::vector<Signs> vectors;
+        for (int copy = 0; copy < copies; ++copy)
+            for (const FacePicture& face : faces)
+                vectors.push_back(convolver.getGaborSODs(
+                    facePatch(face, windowPixels, windowEyeDistance, jitter, random_), {0, 0}));
+        return vectors;
+    }
+
+    std::vector<Signs> mineGabor(std::size_t most, const Accept& accept) {
+        const WindowConvolver convolver;
+        Reservoir reservoir(most, random_);
+        Signs window(SodImage::windowBits);
+        unsigned char* const bytes = window.exclusiveBytes();
+        for (const Image& image : backgrounds_)
+            forEachLevel(image, [&](const ScannedLevel& level) {
+                for (std::uint32_t y = 0; y < level.sods.gridHeight(); ++y)
+                    for (std::uint32_t x = 0; x < level.sods.gridWidth(); ++x) {
+                        level.sods.getWindow(x, y, bytes);
+                        if (!accept(window)) continue;
+                        reservoir.offer([&] {
+                            return convolver.getGaborSODs(
+                                level.bordered.image,
+                                {static_cast<std::int32_t>(x), static_cast<std::int32_t>(y)});
+                        });
+                    }
+            });
+        std::printf("  %zu background windows reach the Gabor stage, %zu are kept\n", reservoir.seen(),
+                    reservoir.vectors().size());
+        return reservoir.vectors();
+    }
+
+    std::vector<Signs> finalFaces(const std::vector<FacePicture>& faces, int copies) {
+        // Clusters sit closer to the face than single windows.
+        const Jitter jitter{0, 0.12f, 0.45f, 0.1f};
+        std::vector<Signs> vectors;
+        for (int copy = 0; copy < copies; ++copy)
+            for (const FacePicture& face : faces)
+                vectors.push_back(finalConvolver_.getGaborSODs(
+                    facePatch(face, finalPixels, finalEyeDistance, jitter, random_), {0, 0}));
+        return vectors;
+    }
+
+    void trainFinal() {
+        std::vector<Signs> faces = finalFaces(faces_, 1), others = candidates_.vectors();
+        const std::vector<Signs> devFaces = finalFaces(devFaces_, 2);
+        TrainedSvm svm = growPolynomial(join(faces, others), {{200}, 0.1f}, random_);
+        setWorkingPoint(svm, devFaces, disc3ASteps);
+        save(svm, out_ / "gs2323fc.dat");
+
+        // A second round with what the finder as it stands reports, with a threshold below the final one.
+        collectFound(faces, others);
+        svm = growPolynomial(join(faces, others), {{200}, 0.1f}, random_);
+        setWorkingPoint(svm, devFaces, disc3ASteps);
+        save(svm, out_ / "gs2323fc.dat");
+    }
+
+    /// Adds what the finder finds on face pictures and backgrounds, by whether it is the labelled face.
+    void collectFound(std::vector<Signs>& faces, std::vector<Signs>& others) {
+        const FNCountedPtr<AppConfigDB> db(new AppVolatileConfigDB);
+        db->set("F.TemplatePath", out_.string());
+        db->set("F.Disc3A.Cascade.200", "-1.2");
+        const T8::FaceFinder finder(Fn::Deployment::Component(
+            db, Fn::Deployment::Property(Fn::Deployment::type<T8::FaceFinder>(), "F", "", "", false)));
+        const auto visit = [&](const Image& image, const auto& place) {
+            std::list<FaceFinder::Location> found;
+            finder.find(FNImageReferenceFactory::create(image), found, windowEyeDistance / image.w(), 0.5,
+                        FaceFinder::everywhere);
+            for (const FaceFinder::Location& location : found) {
+                const float k = 0.35888943f * location.width;
+                const FNPos centre = location.pos + FNPos{-k * std::sin(location.rotationAngle),
+                                                          k * std::cos(location.rotationAngle)};
+                place(location, finalSigns(image, centre, location.width, location.rotationAngle));
+            }
+        };
+        std::size_t hits = 0, misses = 0;
+        for (const Image& image : backgrounds_)
+            visit(image, [&](const FaceFinder::Location&, const Signs& signs) {
+                others.push_back(signs);
+                ++misses;
+            });
+        for (const FacePicture& face : faces_)
+            visit(face.image, [&](const FaceFinder::Location& location, const Signs& signs) {
+                const float distance = length(face.rightEye - face.leftEye);
+                const float off = length(location.pos - (face.leftEye + face.rightEye) / 2.0f) / distance;
+                const float ratio = location.width / distance;
+                if (off < 0.25f && ratio > 0.75f && ratio < 1.33f) {
+                    faces.push_back(signs);
+                    ++hits;
+                } else if (off > 0.5f || ratio < 0.6f || ratio > 1.6f) {
+                    others.push_back(signs);
+                    ++misses;
+                }
+            });
+        std::printf("  the finder reports %zu of %zu faces, and %zu other places\n", hits, faces_.size(),
+                    misses);
+    }
+
+    std::filesystem::path data_, out_;
+    Random random_;
+    FinalConvolver finalConvolver_;
+    Reservoir candidates_{20000, random_};
+    std::vector<FacePicture> faces_, devFaces_;
+    std::vector<Image> backgrounds_;
+    std::unique_ptr<T8::SodDotDiscriminator> first_;
+};
+
+} // namespace
+
+void trainFaceFinder(const std::filesystem::path& data, const std::filesystem::path& out,
+                     std::uint64_t seed) {
+    std::filesystem::create_directories(out);
+    FaceTraining(data, out, seed).run();
+}
+
+} // namespace Train
