@@ -38,13 +38,36 @@ class SuccessiveScaledPyramid : public std::vector<ScaledImage<typename Scaling:
 public:
     using Pixel = typename Scaling::Pixel;
 
-    /// @throws FNEBadArg for a factor that is not positive, or makes a level of 65536 pixels or more in a row
-    /// or
-    ///         column.
+    /// @throws FNEBadArg for a factor that is not positive, or makes a level of 65536 or more columns or rows
     SuccessiveScaledPyramid(const FNImage<Pixel>& source, const std::list<float>& factors) {
         this->reserve(factors.size());
         for (const float factor : factors) this->push_back(Scaling::level(source, factor));
     }
 };
+
+/// Levels of which each is made from the one before by a scaling of a fixed factor; the first is the source
+/// scaled to a given size. Mappings lead to the source.
+template <class T, class Step> class FixedScaleFactorPyramid : public std::vector<ScaledImage<T>> {
+public:
+    /// @param firstFactor how much smaller than the source the first level is
+    /// @param levels number of levels; none at all if the first one has no pixels
+    FixedScaleFactorPyramid(const FNImage<T>& source, float firstFactor, std::size_t levels) {
+        this->reserve(levels);
+        ScaledImage<T> level = PyramidScaling<T>::level(source, firstFactor);
+        if (level.image.empty()) return;
+        this->push_back(level);
+        while (this->size() < levels) {
+            const ScaledImage<T>& larger = this->back();
+            ScaledImage<T> smaller{Step::createDst(larger.image.w(), larger.image.h()), {}};
+            smaller.mapping = Step::scale(larger.image, smaller.image).compose(larger.mapping);
+            this->push_back(smaller);
+        }
+    }
+};
+
+/// How many source pixels one pixel of a level spans, the mean of both axes.
+template <class T> float averageEffectiveFactor(const ScaledImage<T>& level) {
+    return (level.mapping.m0 + level.mapping.m3) / 2;
+}
 
 } // namespace Img
