@@ -1,4 +1,4 @@
-// orbek-eval: accuracy reports over labelled images.
+// orbek-eval: accuracy reports over labelled images. Exit status 0, 1 for a failure, 2 if a picture could not be read.
 
 #include "eval/detect.h"
 #include "eval/finder_access.h"
@@ -47,6 +47,13 @@ int main(int argc, char** argv) {
         const auto pictures = Eval::detect(Eval::makeFaceFinder(etc), options);
         Eval::printDetection(pictures, std::cout);
         if (!json.empty()) writeFile(json, Eval::detectionJson(pictures));
+        int status = 0;
+        for (const Eval::DetectedPicture& picture : pictures)
+            if (!picture.failure.empty()) {
+                std::cerr << "orbek-eval: " << picture.file << ": " << picture.failure << "\n";
+                status = 2;
+            }
+        return status;
     } catch (const std::exception& e) {
         std::cerr << "orbek-eval: " << e.what() << "\n";
         return 1;

@@ -1,0 +1,129 @@
+#include "eval/detect.h"
+#include "labelled/labels.h"
+#include "support/scratch_folder.h"
+#include "support/thrown.h"
+#include "train/discriminator_training.h"
+#include "train/working_point.h"
+
+#include <gtest/gtest.h>
+
+namespace {
+
+using Eye::Implementation::TrainedSvm;
+
+TEST(Labels, RowsCarryTheirFields) {
+    const ScratchFolder scratch;
+    const std::string file = scratch.write("labels.tsv", "file\tperson\teye_left_x\teye_left_y\tage\n"
+                                                         "a.jpg\tAnn\t1.5\t2\t\r\n"
+                                                         "helen_12_1.jpg\t\t\t\t3-9\n");
+    const std::vector<Labelled::Row> rows = Labelled::readLabels(file);
+    ASSERT_EQ(rows.size(), 2u);
+    EXPECT_EQ(rows[0].image(), scratch.path() / "a.jpg");
+    EXPECT_EQ(*rows[0].position("eye_left"), (FNPos{1.5f, 2}));
+    EXPECT_FALSE(rows[0].number("age"));
+    EXPECT_EQ(rows[0].splitKey(), "Ann");
+    EXPECT_FALSE(rows[1].position("eye_left"));
+    EXPECT_FALSE(rows[1].number("age")) << "a range is no number";
+    EXPECT_EQ(rows[1].splitKey(), "helen_12") << "files cut from one photo stay together";
+
+    scratch.write("short.tsv", "file\tage\na.jpg\n");
+    EXPECT_EQ(thrownBy([&] { Labelled::readLabels(scratch.file("short.tsv")); }),
+              "FNEIOError: " + scratch.file("short.tsv") + ", line 2: 1 fields, expected 2");
+    EXPECT_EQ(thrownBy([&] { Labelled::readLabels(scratch.file("none.tsv")); }),
+              "FNEIOError: Cannot read labels from " + scratch.file("none.tsv"));
+}
+
+TEST(Labels, SplitsHaveTheirSharesAndStay) {
+    std::map<Labelled::Split, int> counts;
+    for (int i = 0; i < 20000; ++i) ++counts[Labelled::splitOf("Person_" + std::to_string(i))];
+    EXPECT_NEAR(counts[Labelled::Split::train], 14000, 400);
+    EXPECT_NEAR(counts[Labelled::Split::dev], 3000, 400);
+    EXPECT_NEAR(counts[Labelled::Split::test], 3000, 400);
+    // A change of the hash would mix people that trained files have seen into the test part.
+    EXPECT_EQ(Labelled::splitOf("helen_100032540"), Labelled::Split::dev);
+    EXPECT_EQ(Labelled::splitOf("celeba_001719"), Labelled::Split::train);
+    EXPECT_EQ(Labelled::splitOf("10001"), Labelled::Split::train);
+    EXPECT_EQ(Labelled::splitOf("net_7876"), Labelled::Split::test);
+}
+
+TEST(OperatingCurve, CountsFacesAndFalseAlarmsFromTheTop) {
+    Eval::DetectedPicture first, second;
+    first.faces = {{20, 0.5f}, {30, {}}};
+    first.falseAlarms = {0.1f};
+    second.faces = {{25, 0.2f}};
+    const std::vector<Eval::OperatingPoint> curve = Eval::operatingCurve({first, second});
+    ASSERT_EQ(curve.size(), 3u);
+    EXPECT_EQ(curve[0].confidence, 0.5f);
+    EXPECT_NEAR(curve[1].recall, 2.0 / 3, 1e-9);
+    EXPECT_EQ(curve[1].falseAlarmsPerImage, 0);
+    EXPECT_EQ(curve[2].falseAlarmsPerImage, 0.5);
+}
+
+/// Two classes of sign vectors: noisy copies of a pattern or of its negative (a machine of degree 2 has to
+/// tell a pattern from its negative by the linear part of its kernel), against noise.
+Train::SignSet noisyPatterns(std::size_t n, unsigned seed) {
+    constexpr std::uint32_t d = 256;
+    Train::Random random(seed);
+    std::mt19937 patternRandom(5);
+    std::vector<float> pattern(d);
+    for (float& value : pattern) value = patternRandom() % 2 ? 1.0f : -1.0f;
+    Train::SignSet set;
+    for (std::size_t i = 0; i < n; ++i) {
+        const bool isFace = i % 2 == 0;
+        std::vector<float> values(d);
+        for (std::uint32_t k = 0; k < d; ++k)
+            values[k] = isFace && random() % 10 < 4 ? pattern[k] : (random() % 2 ? 1.0f : -1.0f);
+        set.add(Train::signsOf(values.data(), d), isFace);
+    }
+    return set;
+}
+
+double accuracy(const TrainedSvm& svm, const Train::SignSet& set) {
+    double right = 0;
+    for (std::size_t i = 0; i < set.size(); ++i)
+        right += (svm.evaluate(set.vectors[i]) >= 0) == (set.labels[i] > 0.5f);
+    return right / static_cast<double>(set.size());
+}
+
+std::vector<Train::Signs> facesOf(const Train::SignSet& set) {
+    std::vector<Train::Signs> faces;
+    for (std::size_t i = 0; i < set.size(); ++i)
+        if (set.labels[i] > 0.5f) faces.push_back(set.vectors[i]);
+    return faces;
+}
+
+TEST(Training, MachinesTellUnseenVectorsApart) {
+    const Train::SignSet train = noisyPatterns(2000, 1), test = noisyPatterns(2000, 2);
+    Train::Random random(3);
+    TrainedSvm dot = Train::trainDot(train, 2, random);
+    Train::setWorkingPoint(dot, facesOf(train), {{1, -1.0, 0.99}, {2, 0.0, 0.98}});
+    EXPECT_EQ(dot.supportVectors.size(), 2u);
+    EXPECT_GT(accuracy(dot, test), 0.95);
+
+    TrainedSvm polynomial = Train::growPolynomial(train, {{3, 8}, 0.1f, 500}, random);
+    Train::setWorkingPoint(polynomial, facesOf(train), {{3, -0.5, 0.99}, {8, 0.0, 0.98}});
+    EXPECT_EQ(polynomial.supportVectors.size(), 8u);
+    EXPECT_GT(accuracy(polynomial, test), 0.95);
+}
+
+TEST(Training, WorkingPointsKeepTheWantedShares) {
+    const Train::SignSet set = noisyPatterns(4000, 4);
+    const std::vector<Train::Signs> faces = facesOf(set);
+    Train::Random random(6);
+    TrainedSvm svm = Train::trainDot(set, 6, random);
+    const std::vector<Train::WorkingStep> steps = {{1, -2.0, 0.999}, {2, -0.5, 0.99}, {6, 0.2, 0.97}};
+    Train::setWorkingPoint(svm, faces, steps);
+    for (const Train::WorkingStep& step : steps) {
+        TrainedSvm prefix = svm;
+        prefix.alphas.resize(step.vectors);
+        prefix.supportVectors.resize(step.vectors);
+        double kept = 0;
+        for (const Train::Signs& face : faces) kept += prefix.evaluate(face) >= step.threshold;
+        EXPECT_GE(kept / static_cast<double>(faces.size()), step.keep - 0.002) << step.vectors;
+        if (step.vectors == 6) {
+            EXPECT_LE(kept / static_cast<double>(faces.size()), step.keep + 0.002);
+        }
+    }
+}
+
+} // namespace
