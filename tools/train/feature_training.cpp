@@ -22,7 +22,7 @@ using Eye::Implementation::TrainedSvm;
 
 /// Distances from the labelled place, in pixels of the level: nearer windows are the feature, farther ones
 /// are not, and those between are not learned.
-constexpr float nearEnough = 0.75f, farEnough = 2.0f;
+constexpr float nearEnough = 0.6f, farEnough = 1.3f;
 /// What lies farther than this is another thing, not the feature's own surroundings.
 constexpr float elsewhere = 4.0f;
 
