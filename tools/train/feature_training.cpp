@@ -21,10 +21,20 @@ using namespace Eye::Ojo::T8;
 using Eye::Implementation::TrainedSvm;
 
 /// Distances from the labelled place, in pixels of the level: nearer windows are the feature, farther ones
-/// are not, and those between are not learned.
-constexpr float nearEnough = 0.6f, farEnough = 1.3f;
+/// are not, and those between are so in part.
+constexpr float nearEnough = 0.75f, farEnough = 2.0f;
 /// What lies farther than this is another thing, not the feature's own surroundings.
 constexpr float elsewhere = 4.0f;
+
+/// The median score of the feature above the threshold. The place that is found is a mean of windows weighted
+/// with the exponential of their scores: with a greater spread, the best one alone would decide.
+constexpr double mostSpread = 1.5;
+
+/// How far a window at its right scale is the feature.
+float likeness(float distance) {
+    constexpr float spread = 0.7f;
+    return distance < farEnough ? std::exp(-distance * distance / (2 * spread * spread)) : 0;
+}
 
 /// An area to search, and what is there.
 struct Target {
@@ -57,22 +67,29 @@ private:
     std::vector<std::uint32_t> places_;
 };
 
+/// A window in the layout of the scan.
+struct Window {
+    Signs signs;
+    float distance = 0; ///< from the labelled place, pixels of the level
+    bool rightScale = false;
+};
+
 /// Keeps the windows of the greatest rank.
 class Hardest {
 public:
     static constexpr float ignored = -std::numeric_limits<float>::infinity();
 
     explicit Hardest(std::size_t most) : most_(most) {}
-    void offer(const Signs& window, float rank) {
+    void offer(const Window& window, float rank) {
         if (rank == ignored) return;
         windows_.emplace(rank, window);
         if (windows_.size() > most_) windows_.erase(windows_.begin());
     }
-    const std::multimap<float, Signs>& windows() const { return windows_; }
+    const std::multimap<float, Window>& windows() const { return windows_; }
 
 private:
     std::size_t most_;
-    std::multimap<float, Signs> windows_;
+    std::multimap<float, Window> windows_;
 };
 
 template <class Scan> class FeatureTraining {
@@ -85,7 +102,7 @@ public:
         constexpr double smallShare = 0.3;
         constexpr std::size_t vectorsOfRounds[] = {60, 120};
         faces_ = loadLabelledFaces(data, Labelled::Split::train, mostFaces, smallShare, random_);
-        collect(2, [&](const Signs&) { return static_cast<float>(random_() >> 40); });
+        collect(2, [&](const Signs&) { return anyRank(); });
         const std::vector<Signs> dev =
             trueWindows(loadLabelledFaces(data, Labelled::Split::dev, mostDevFaces, smallShare, random_));
 
@@ -113,7 +130,21 @@ private:
         for (const WorkingStep& step : steps) settings.groups.push_back(step.vectors);
         TrainedSvm svm = growPolynomial(set_, settings, random_);
         setWorkingPoint(svm, dev, steps);
+        limitSpread(svm, dev);
         return svm;
+    }
+
+    /// Brings scores closer to the last threshold, if need be; what passes there stays the same.
+    void limitSpread(TrainedSvm& svm, const std::vector<Signs>& dev) const {
+        const double threshold = steps_.back().threshold;
+        std::vector<double> scores;
+        for (const Signs& window : dev) scores.push_back(svm.evaluate(window));
+        const auto middle = scores.begin() + static_cast<std::ptrdiff_t>(scores.size() / 2);
+        std::nth_element(scores.begin(), middle, scores.end());
+        const double gain = mostSpread / (*middle - threshold);
+        if (gain >= 1) return;
+        for (float& alpha : svm.alphas) alpha = static_cast<float>(alpha * gain);
+        svm.bias = static_cast<float>(gain * (svm.bias + threshold) - threshold);
     }
 
     /// Of the eye distances that the levels of a target's area stand for, the one that fits its face best.
@@ -128,11 +159,6 @@ private:
                                             [&](float a, float b) { return misfit(a) < misfit(b); });
     }
 
-    struct Window {
-        Signs signs;    ///< in the layout of the scan
-        float distance; ///< from the labelled place, pixels of the level
-        bool rightScale;
-    };
     template <class Visit>
     static void forEachWindowOf(const LabelledFace& face, const Target& target, Visit visit) {
         const float best = bestSize(target);
@@ -142,33 +168,40 @@ private:
         });
     }
 
-    /// Adds windows at the labelled places, and of those away from them the ones with the greatest rank, up
-    /// to `most` around each feature and as many elsewhere.
+    /// Adds windows at the labelled places, `most` of those next to each, and of those away from them the
+    /// ones with the greatest rank, up to `most` around each feature and as many elsewhere.
     void collect(std::size_t most, const std::function<float(const Signs&)>& rank) {
         const std::size_t before = set_.size();
         for (const LabelledFace& face : faces_)
             for (const Target& target : targets_(face, random_)) {
-                Hardest around(most), others(most);
+                Hardest slope(most), around(most), others(most);
                 forEachWindowOf(face, target, [&](const Window& window) {
-                    if (window.rightScale && window.distance < nearEnough)
-                        set_.add(trainedOrder_(window.signs), true);
-                    else if (window.distance > farEnough)
-                        (window.distance < elsewhere ? around : others)
-                            .offer(window.signs, rank(window.signs));
+                    if (window.distance > farEnough)
+                        (window.distance < elsewhere ? around : others).offer(window, rank(window.signs));
+                    else if (window.rightScale && window.distance < nearEnough)
+                        learn(window, likeness(window.distance));
+                    else if (window.rightScale)
+                        slope.offer(window, anyRank());
                 });
+                for (const auto& [r, window] : slope.windows()) learn(window, likeness(window.distance));
                 for (const Hardest* const hardest : {&around, &others})
-                    for (const auto& [r, signs] : hardest->windows()) set_.add(trainedOrder_(signs), false);
+                    for (const auto& [r, window] : hardest->windows()) learn(window, 0);
             }
         std::printf("  %zu windows more, %zu in all\n", set_.size() - before, set_.size());
         std::fflush(stdout);
     }
+    void learn(const Window& window, float label) {
+        set_.vectors.push_back(trainedOrder_(window.signs));
+        set_.labels.push_back(label);
+    }
+    float anyRank() { return static_cast<float>(random_() >> 40); }
 
     /// The window closest to each labelled place.
     std::vector<Signs> trueWindows(const std::vector<LabelledFace>& faces) {
         std::vector<Signs> windows;
         for (const LabelledFace& face : faces)
             for (const Target& target : targets_(face, random_)) {
-                Window closest{{}, nearEnough, false};
+                Window closest{Signs(), nearEnough, false};
                 forEachWindowOf(face, target, [&](const Window& window) {
                     if (window.rightScale && window.distance < closest.distance) closest = window;
                 });
@@ -192,14 +225,18 @@ std::vector<Target> eyeTargets(const LabelledFace& face, Random& random) {
             {areas.second, face.rightEye, face.eyeDistance()}};
 }
 
-/// One area, mirrored at random.
+/// One area as it is, one mirrored.
 std::vector<Target> placedTarget(const LabelledFace& face, const std::optional<FNPos>& feature,
                                  const Placement& placement, Random& random) {
     if (!feature) return {};
-    const EyePair eyes = jitteredEyes(face, random);
-    SearchArea area = placement.area(eyes.first.pos, eyes.second.pos);
-    if (random() % 2 == 0) area = {area.origin + area.u, -area.u, area.v};
-    return {{area, *feature, face.eyeDistance()}};
+    std::vector<Target> targets;
+    for (const bool mirrored : {false, true}) {
+        const EyePair eyes = jitteredEyes(face, random);
+        SearchArea area = placement.area(eyes.first.pos, eyes.second.pos);
+        if (mirrored) area = {area.origin + area.u, -area.u, area.v};
+        targets.push_back({area, *feature, face.eyeDistance()});
+    }
+    return targets;
 }
 
 template <class Scan>
