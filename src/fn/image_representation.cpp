@@ -103,14 +103,18 @@ FNImageReference decodedPayload(const Fn::Package& payload, Reference::Serializa
                                                  : Fn::readJpegLS(bytes, block.size());
 }
 
-template <class T> FNImage<T> unpackedPixels(const Fn::Package& payload, Reference::SerializationStrategy strategy) {
+template <class T>
+FNImage<T> unpackedPixels(const Fn::Package& payload, Reference::SerializationStrategy strategy) {
     switch (strategy) {
-    case Reference::UNCOMPRESSED_RAW: return Fn::deSerialize<FNImage<T>>(payload);
+    case Reference::UNCOMPRESSED_RAW:
+        return Fn::deSerialize<FNImage<T>>(payload);
     case Reference::COMPRESSED_PNG:
-    case Reference::COMPRESSED_JPEGLS: return decodedPayload(payload, strategy).to<T>();
+    case Reference::COMPRESSED_JPEGLS:
+        return decodedPayload(payload, strategy).to<T>();
     }
-    FN_THROW(FNEBadFormat, "FNImageReference: de-serialization error -- unknown image serialization format (" +
-                               std::to_string(strategy) + ")");
+    FN_THROW(FNEBadFormat,
+             "FNImageReference: de-serialization error -- unknown image serialization format (" +
+                 std::to_string(strategy) + ")");
 }
 
 template <class Representation> FNCountedPtr<Reference::Representation> readAs(Fn::PackageReader& elements) {

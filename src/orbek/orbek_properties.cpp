@@ -1,5 +1,6 @@
 #include "orbek/orbek_properties.h"
 
+#include "eye/cara/face_finder.h"
 #include "fg/capture_types.h"
 #include "fn/deployment/composite_values.h"
 
@@ -50,7 +51,7 @@ struct CamControl {
 
 std::list<Property> members() {
     return properties(
-        pending("FaceFinder", "Eye::Cara::T8::FaceFinder", "Face Finder"),
+        property<Eye::Cara::T8::FaceFinder>::create("FaceFinder", "Face Finder"),
         pending("EyesFinder", "Eye::Ojo::T8::EyesFinder", "Eyes Finder to use."),
         property<ComparisonModule>::create("ComparisonAlgorithm", "Type of Comparison Algorithm"),
         pending("SetEnroller", "Kx::SetEnroller", "Set Enroller"),

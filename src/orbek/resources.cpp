@@ -1,5 +1,7 @@
 #include "orbek/resources.h"
 
+#include "eye/cara/face_finder.h"
+#include "fn/message/translator.h"
 #include "orbek/orbek_properties.h"
 
 namespace Orbek {
@@ -15,6 +17,12 @@ Resources::Resources(const FNCountedPtr<AppConfigDB>& configDb)
 Component Resources::rootComponent() const {
     const FNMutexLock lock(mutex_);
     return rootComponent_;
+}
+
+FaceFinder Resources::faceFinder() const {
+    return FaceFinder(faceFinder_.get(mutex_, FNTrans("Face finder"), [&] {
+        return new Eye::Cara::T8::FaceFinder(rootComponent_.subComponent("FaceFinder"));
+    }));
 }
 
 } // namespace Orbek

@@ -1,26 +1,11 @@
 #pragma once
 
+#include "eye/face_finder.h"
 #include "fn/deployment/app_config_db.h"
 #include "fn/deployment/component.h"
 #include "fn/thread/mutex.h"
 
 namespace Orbek {
-
-/// What all objects made from one configuration share: the tree of settings, and the heavy engines, each made
-/// at the first request for it.
-class Resources {
-public:
-    explicit Resources(const FNCountedPtr<AppConfigDB>& configDb);
-
-    Fn::Deployment::Component rootComponent() const;
-    FNCountedPtr<AppConfigDB> configDb() const { return configDb_; }
-
-private:
-    /// Held while an engine is made; recursive, since making one engine may ask for another.
-    FNMutex mutex_{FNMutex::recursive};
-    FNCountedPtr<AppConfigDB> configDb_;
-    Fn::Deployment::Component rootComponent_;
-};
 
 /// One shared engine: goes once from unmade to made.
 template <class Engine> class MadeOnce {
@@ -42,6 +27,27 @@ public:
 
 private:
     mutable FNCountedPtr<Engine> engine_;
+};
+
+/// What all objects made from one configuration share: the tree of settings, and the heavy engines, each made
+/// at the first request for it.
+class Resources {
+public:
+    explicit Resources(const FNCountedPtr<AppConfigDB>& configDb);
+
+    Fn::Deployment::Component rootComponent() const;
+    FNCountedPtr<AppConfigDB> configDb() const { return configDb_; }
+
+    /// The engines. The first request reads the model files, and is slow.
+    /// @throws FNEGeneric "<engine> : <reason>" if one cannot be made
+    FaceFinder faceFinder() const;
+
+private:
+    /// Held while an engine is made; recursive, since making one engine may ask for another.
+    FNMutex mutex_{FNMutex::recursive};
+    FNCountedPtr<AppConfigDB> configDb_;
+    Fn::Deployment::Component rootComponent_;
+    MadeOnce<FaceFinder::Body> faceFinder_;
 };
 
 } // namespace Orbek

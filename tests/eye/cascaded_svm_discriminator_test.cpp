@@ -348,7 +348,7 @@ TEST_F(DiscriminatorFile, IsNamedWithTheReasonOfItsFailure) {
     EXPECT_EQ(reason(file({Fn::Package(FNVector<float>(0)), vector})), "invalid alphas");
     // Counts beyond anything that follows.
     EXPECT_EQ(reason("FullPolynomial 2 0 1 0\n\xFF\xFF\xFF\xFF"), "invalid alphas");
-    EXPECT_EQ(reason(std::string("FullPolynomial 2 0 1 0\n\0\0\0\2\0\0\0\4\xFF\xFF\xFF\xFF", 39)),
+    EXPECT_EQ(reason(std::string("FullPolynomial 2 0 1 0\n\0\0\0\2\0\0\0\4\xFF\xFF\xFF\xFF", 35)),
               "invalid alphas");
 }
 

@@ -105,6 +105,14 @@ TEST(Resources, AnEngineIsMadeOnceAndAFailureLeavesItUnmade) {
     EXPECT_EQ(made, 1);
 }
 
+TEST(Resources, MissingModelsAreNamedWithTheirPath) {
+    const Orbek::Configuration configuration = fromText("ORBEK.Substitutions.INSTALLDIR = /no/such\n");
+    const auto implementation = Orbek::Configuration::Implementation::implementation(configuration);
+    const std::string failure = thrownBy([&] { implementation->resources().faceFinder(); });
+    EXPECT_EQ(failure.rfind("FNEGeneric: Face finder : ", 0), 0u) << failure;
+    EXPECT_NE(failure.find("/no/such/etc/cara/"), std::string::npos) << failure;
+}
+
 TEST(PublicHandle, FollowsTheSameRulesAsTheInnerOne) {
     struct Counted {
         explicit Counted(int& deaths) : deaths_(deaths) {}

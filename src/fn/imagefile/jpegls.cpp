@@ -88,20 +88,31 @@ template <class Gray, class Color> FNImageReference toReference(const Samples& s
     return FNImageReferenceFactory::create(image);
 }
 
-/// Where the coded data of each scan ends: at its next marker, or at the end of the file.
+/// Where the coded data that begin at `at` end: at the next marker, or with the file.
+std::size_t scanEnd(const FNRMem<unsigned char>& file, std::size_t at) {
+    const unsigned char* const bytes = file.data();
+    for (; at < file.size(); ++at)
+        if (bytes[at] == 0xFF && (at + 1 == file.size() || bytes[at + 1] >= 0x80)) return at;
+    return file.size();
+}
+
+/// Where the coded data of each scan end. @throws FNEBadFormat if a restart marker ends one
 std::vector<std::size_t> scanEnds(const FNRMem<unsigned char>& file) {
     constexpr std::size_t mostScans = 4;
-    constexpr unsigned char scanMarker = 0xDA, restartMarker = 0xD0;
+    constexpr unsigned char startMarker = 0xD8, scanMarker = 0xDA, restartMarker = 0xD0;
     const unsigned char* const bytes = file.data();
     std::vector<std::size_t> ends;
-    for (std::size_t at = 2; at + 4 <= file.size() && bytes[at] == 0xFF && ends.size() < mostScans;) {
-        const unsigned char marker = bytes[at + 1];
-        at += 2 + (std::size_t{bytes[at + 2]} << 8 | bytes[at + 3]);
+    for (std::size_t at = 0; at + 4 <= file.size() && bytes[at] == 0xFF && ends.size() < mostScans;) {
+        const unsigned char marker = bytes[++at];
+        if (marker == 0xFF) continue; // any number of these may stand before a marker
+        ++at;
+        if (marker == startMarker) continue; // has no segment
+        at += std::size_t{bytes[at]} << 8 | bytes[at + 1];
         if (marker != scanMarker) continue;
-        while (at + 1 < file.size() && (bytes[at] != 0xFF || bytes[at + 1] < 0x80)) ++at;
+        at = scanEnd(file, at);
         if (at + 1 < file.size() && (bytes[at + 1] & 0xF8) == restartMarker)
             FN_THROW(FNEBadFormat, "readJpegLS(): Parameter value not supported");
-        ends.push_back(std::min<std::size_t>(at, file.size()));
+        ends.push_back(at);
     }
     return ends;
 }
@@ -157,21 +168,34 @@ template <class Sample, class Color> std::vector<Sample> toTriples(const FNImage
     return samples;
 }
 
+/// Codes into `bytes`. @return the number of bytes written. @throws charls::jpegls_error
+template <class Sample>
+std::size_t encodeInto(std::vector<unsigned char>& bytes, const Sample* samples, std::uint32_t w,
+                       std::uint32_t h, int components) {
+    charls::jpegls_encoder encoder;
+    encoder.frame_info({w, h, 8 * sizeof(Sample), components});
+    if (components > 1) encoder.interleave_mode(charls::interleave_mode::line);
+    bytes.resize(std::max(bytes.size(), encoder.estimated_destination_size()));
+    encoder.destination(bytes);
+    return encoder.encode(samples, std::size_t{w} * h * static_cast<unsigned>(components) * sizeof(Sample));
+}
+
 template <class Sample>
 FNRMem<unsigned char> encode(const Sample* samples, std::uint32_t w, std::uint32_t h, int components) {
-    try {
-        charls::jpegls_encoder encoder;
-        encoder.frame_info({w, h, 8 * sizeof(Sample), components});
-        if (components > 1) encoder.interleave_mode(charls::interleave_mode::line);
-        std::vector<unsigned char> bytes(encoder.estimated_destination_size());
-        encoder.destination(bytes);
-        const std::size_t written =
-            encoder.encode(samples, std::size_t{w} * h * static_cast<unsigned>(components) * sizeof(Sample));
-        FNRMem<unsigned char> result(written);
-        std::copy_n(bytes.begin(), written, result.getExclusive());
-        return result;
-    } catch (const charls::jpegls_error& error) {
-        FN_THROW(FNESysError, std::string("writeJpegLS(): ") + textOf(error));
+    // CharLS's estimate is too small for noise, whose codes are longer than its samples: at most four times.
+    constexpr int mostAttempts = 4;
+    std::vector<unsigned char> bytes;
+    for (int attempt = 1;; ++attempt) {
+        try {
+            const std::size_t written = encodeInto(bytes, samples, w, h, components);
+            FNRMem<unsigned char> result(written);
+            std::copy_n(bytes.begin(), written, result.getExclusive());
+            return result;
+        } catch (const charls::jpegls_error& error) {
+            if (error.code() != charls::jpegls_errc::destination_buffer_too_small || attempt == mostAttempts)
+                FN_THROW(FNESysError, std::string("writeJpegLS(): ") + textOf(error));
+        }
+        bytes.resize(2 * bytes.size());
     }
 }
 

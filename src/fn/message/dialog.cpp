@@ -1,25 +1,16 @@
 #include "fn/message/dialog.h"
 
-#include <ctime>
+#include "fn/time_stamp.h"
+
 #include <iostream>
 #include <mutex>
 
 namespace {
 
-/// Date, one blank, time of day.
-std::string localTime() {
-    const std::time_t now = std::time(nullptr);
-    std::tm parts{};
-    localtime_r(&now, &parts);
-    char text[64];
-    std::strftime(text, sizeof text, "%Y-%m-%d %H:%M:%S", &parts);
-    return text;
-}
-
 void writeLine(std::ostream& stream, const char* kind, const std::string& message) {
     static std::mutex& oneLineAtATime = *new std::mutex; // messages come until the very end of the process
     const std::lock_guard lock(oneLineAtATime);
-    stream << "[" + localTime() + "]" + kind + message << std::endl;
+    stream << "[" + Fn::TimeStamp::now().localAsString() + "]" + kind + message << std::endl;
 }
 
 std::mutex& sinkMutex = *new std::mutex;

@@ -19,6 +19,7 @@
 #include <gtest/gtest.h>
 
 #include <functional>
+#include <random>
 #include <sstream>
 
 namespace {
@@ -309,6 +310,16 @@ TEST(JpegLS, ReadsBackEveryPixelType) {
                 StartsWith("FNEBadFormat: readJpegLS(): "));
     EXPECT_EQ(thrownBy([&] { Fn::writeJpegLS(Factory::create(FNImage<float>())); }),
               "FNESysError: writeJpegLS(): Invalid JlsParameters");
+}
+
+TEST(JpegLS, NoiseThatGrowsByCompressionIsWritten) {
+    FNImage<unsigned short> noise(300, 300);
+    std::mt19937 random(5);
+    for (FNImIter<unsigned short> it(noise, noise.box()); !it.atEnd(); ++it)
+        *it = static_cast<unsigned short>(random());
+    const FNRMem<unsigned char> bytes = Fn::writeJpegLS(Factory::create(noise));
+    EXPECT_GT(bytes.size(), 2 * noise.size());
+    EXPECT_EQ(Fn::readJpegLS(reinterpret_cast<const char*>(bytes.data()), bytes.size()).toMono16(), noise);
 }
 
 // ---- TIFF

@@ -2,13 +2,10 @@
 
 #include "fn/image_conversion.h"
 
-#include <atomic>
 #include <cstdlib>
 #include <fstream>
 #include <iterator>
 #include <stdexcept>
-
-#include <unistd.h>
 
 namespace {
 
@@ -41,18 +38,6 @@ template <class T> std::string netpbmOf(const FNImage<T>& image) {
 
 } // namespace
 
-Workshop::Workshop() {
-    static std::atomic<int> count = 0;
-    folder_ = std::filesystem::temp_directory_path() /
-              ("orbek_images_" + std::to_string(::getpid()) + "_" + std::to_string(count++));
-    std::filesystem::create_directories(folder_);
-}
-
-Workshop::~Workshop() {
-    std::error_code ignored;
-    std::filesystem::remove_all(folder_, ignored);
-}
-
 bool Workshop::has(const std::string& program) {
     const std::string test = program == "convert" ? "convert -version 2>/dev/null | grep -q ImageMagick"
                                                   : "command -v " + program + " >/dev/null 2>&1";
@@ -60,12 +45,9 @@ bool Workshop::has(const std::string& program) {
 }
 
 void Workshop::run(const std::string& command) const {
-    if (std::system(("cd '" + folder_.string() + "' && { " + command + " ; } >/dev/null 2>log").c_str()) != 0)
-        throw std::runtime_error(command + " failed: " + bytesOfFile(folder_ / "log"));
-}
-
-void Workshop::write(const std::string& name, const std::string& bytes) const {
-    std::ofstream(path(name), std::ios::binary) << bytes;
+    if (std::system(
+            ("cd '" + folder_.path().string() + "' && { " + command + " ; } >/dev/null 2>log").c_str()) != 0)
+        throw std::runtime_error(command + " failed: " + folder_.read("log"));
 }
 
 std::string bytesOfFile(const std::filesystem::path& path) {

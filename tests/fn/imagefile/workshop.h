@@ -2,6 +2,7 @@
 
 #include "fn/image_reference.h"
 #include "fn/imagefile/properties_feedback.h"
+#include "support/scratch_folder.h"
 
 #include <filesystem>
 #include <string>
@@ -10,21 +11,16 @@
 /// A folder of its own for one test, where other programs make files.
 class Workshop {
 public:
-    Workshop();
-    ~Workshop();
-    Workshop(const Workshop&) = delete;
-    Workshop& operator=(const Workshop&) = delete;
-
     /// Whether a program is installed; for "convert", whether it is ImageMagick's.
     static bool has(const std::string& program);
 
-    std::string path(const std::string& name) const { return (folder_ / name).string(); }
+    std::string path(const std::string& name) const { return folder_.file(name); }
     /// Runs a command line in the folder. @throws std::runtime_error if it fails.
     void run(const std::string& command) const;
-    void write(const std::string& name, const std::string& bytes) const;
+    void write(const std::string& name, const std::string& bytes) const { folder_.write(name, bytes); }
 
 private:
-    std::filesystem::path folder_;
+    ScratchFolder folder_;
 };
 
 std::string bytesOfFile(const std::filesystem::path& path);
