@@ -6,6 +6,7 @@
 #include "fn/deployment/app_config_db.h"
 #include "fn/image_reference.h"
 #include "fn/image_representation.h"
+#include "train/face_samples.h"
 #include "train/feature_samples.h"
 
 #include <algorithm>
@@ -87,6 +88,25 @@ void measureEyes(const std::vector<LabelledFace>& faces, const EyesFinder::Body&
     again.print(what + ", again around them");
 }
 
+/// How often both eyes are seen where there is no face.
+void measureBackgrounds(const std::vector<FNImage<unsigned short>>& backgrounds,
+                        const EyesFinder::Body& finder, const std::string& what) {
+    constexpr float eyeDistances[] = {20, 40};
+    std::size_t places = 0, seen = 0;
+    for (const FNImage<unsigned short>& background : backgrounds)
+        for (const float distance : eyeDistances) {
+            const FNPos middle{static_cast<float>(background.w()) / 2,
+                               static_cast<float>(background.h()) / 2};
+            bool foundFirst, foundSecond;
+            FacialFeatureLocation first, second;
+            finder.find({middle, distance, 0, 0}, FNImageReferenceFactory::create(background), foundFirst,
+                        first, foundSecond, second);
+            ++places;
+            seen += foundFirst && foundSecond;
+        }
+    std::printf("%s, on background: seen at %zu of %zu places\n", what.c_str(), seen, places);
+}
+
 template <class Finder>
 void measureFeature(const std::vector<LabelledFace>& faces, const Finder& finder,
                     std::optional<FNPos> LabelledFace::*feature, const std::string& what,
@@ -112,9 +132,13 @@ void measureFeatureFinders(const std::filesystem::path& data, const std::filesys
     Random random(seed);
     const std::vector<LabelledFace> faces =
         loadLabelledFaces(data, Labelled::Split::test, mostFaces, 0, random);
-    for (const char* const choice : {"Strict", "Tolerant"})
-        measureEyes(faces, finderWith<Eye::Ojo::T8::EyesFinder>(etc / "ojo", choice),
-                    std::string("eyes, ") + choice, seed);
+    const auto backgrounds = loadBackgrounds(data, Labelled::Split::test);
+    for (const char* const choice : {"Strict", "Tolerant"}) {
+        const auto finder = finderWith<Eye::Ojo::T8::EyesFinder>(etc / "ojo", choice);
+        const std::string what = std::string("eyes, ") + choice;
+        measureEyes(faces, finder, what, seed);
+        measureBackgrounds(backgrounds, finder, what);
+    }
     measureFeature(faces, finderWith<Eye::Boca::MouthFinder>(etc / "boca"), &LabelledFace::mouth, "mouth",
                    seed);
     measureFeature(faces, finderWith<Eye::Raiz::BridgeFinder>(etc / "raiz"), &LabelledFace::bridge,
