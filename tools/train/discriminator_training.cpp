@@ -72,8 +72,7 @@ private:
             batch.push_back(static_cast<std::size_t>(std::min<std::ptrdiff_t>(
                 at - cumulated.begin(), static_cast<std::ptrdiff_t>(set_.size()) - 1)));
         }
-        for (const std::size_t i : batch)
-            pulls.push_back(set_.labels[i] > sigmoid(decision_[i]) ? 1.0f : -1.0f);
+        for (const std::size_t i : batch) pulls.push_back(set_.labels[i] > 0.5f ? 1.0f : -1.0f);
         return batch;
     }
 

@@ -21,20 +21,14 @@ using namespace Eye::Ojo::T8;
 using Eye::Implementation::TrainedSvm;
 
 /// Distances from the labelled place, in pixels of the level: nearer windows are the feature, farther ones
-/// are not, and those between are so in part.
+/// are not, and those between are not learned.
 constexpr float nearEnough = 0.75f, farEnough = 2.0f;
 /// What lies farther than this is another thing, not the feature's own surroundings.
 constexpr float elsewhere = 4.0f;
 
 /// The median score of the feature above the threshold. The place that is found is a mean of windows weighted
 /// with the exponential of their scores: with a greater spread, the best one alone would decide.
-constexpr double mostSpread = 1.5;
-
-/// How far a window at its right scale is the feature.
-float likeness(float distance) {
-    constexpr float spread = 0.7f;
-    return distance < farEnough ? std::exp(-distance * distance / (2 * spread * spread)) : 0;
-}
+constexpr double mostSpread = 0.5;
 
 /// An area to search, and what is there.
 struct Target {
@@ -102,12 +96,10 @@ public:
         constexpr double smallShare = 0.3;
         constexpr std::size_t vectorsOfRounds[] = {60, 120};
         faces_ = loadLabelledFaces(data, Labelled::Split::train, mostFaces, smallShare, random_);
+        devFaces_ = loadLabelledFaces(data, Labelled::Split::dev, mostDevFaces, smallShare, random_);
         collect(2, [&](const Signs&) { return anyRank(); });
-        const std::vector<Signs> dev =
-            trueWindows(loadLabelledFaces(data, Labelled::Split::dev, mostDevFaces, smallShare, random_));
-
         for (const std::size_t vectors : vectorsOfRounds) {
-            const Discriminator discriminator(grown(vectors, dev), {"round", {}});
+            const Discriminator discriminator(grown(vectors), {"round", {}});
             const float threshold = static_cast<float>(steps_.back().threshold) - 0.5f;
             collect(2, [&](const Signs& window) {
                 float score;
@@ -115,7 +107,7 @@ public:
                 return score > threshold ? score : Hardest::ignored;
             });
         }
-        return grown(steps_.back().vectors, dev);
+        return grown(steps_.back().vectors);
     }
 
 private:
@@ -123,12 +115,13 @@ private:
     using Layout = typename Search::Layout;
     using Discriminator = typename Search::Discriminator;
 
-    TrainedSvm grown(std::size_t vectors, const std::vector<Signs>& dev) {
+    TrainedSvm grown(std::size_t vectors) {
         GrowthSettings settings;
         std::vector<WorkingStep> steps = steps_;
         steps.back().vectors = vectors;
         for (const WorkingStep& step : steps) settings.groups.push_back(step.vectors);
         TrainedSvm svm = growPolynomial(set_, settings, random_);
+        const std::vector<Signs> dev = bestWindows(svm);
         setWorkingPoint(svm, dev, steps);
         limitSpread(svm, dev);
         return svm;
@@ -168,44 +161,44 @@ private:
         });
     }
 
-    /// Adds windows at the labelled places, `most` of those next to each, and of those away from them the
-    /// ones with the greatest rank, up to `most` around each feature and as many elsewhere.
+    /// Adds windows at the labelled places, and of those away from them the ones with the greatest rank, up
+    /// to `most` around each feature and as many elsewhere.
     void collect(std::size_t most, const std::function<float(const Signs&)>& rank) {
         const std::size_t before = set_.size();
         for (const LabelledFace& face : faces_)
             for (const Target& target : targets_(face, random_)) {
-                Hardest slope(most), around(most), others(most);
+                Hardest around(most), others(most);
                 forEachWindowOf(face, target, [&](const Window& window) {
-                    if (window.distance > farEnough)
+                    if (window.rightScale && window.distance < nearEnough)
+                        set_.add(trainedOrder_(window.signs), true);
+                    else if (window.distance > farEnough)
                         (window.distance < elsewhere ? around : others).offer(window, rank(window.signs));
-                    else if (window.rightScale && window.distance < nearEnough)
-                        learn(window, likeness(window.distance));
-                    else if (window.rightScale)
-                        slope.offer(window, anyRank());
                 });
-                for (const auto& [r, window] : slope.windows()) learn(window, likeness(window.distance));
                 for (const Hardest* const hardest : {&around, &others})
-                    for (const auto& [r, window] : hardest->windows()) learn(window, 0);
+                    for (const auto& [r, window] : hardest->windows())
+                        set_.add(trainedOrder_(window.signs), false);
             }
         std::printf("  %zu windows more, %zu in all\n", set_.size() - before, set_.size());
         std::fflush(stdout);
     }
-    void learn(const Window& window, float label) {
-        set_.vectors.push_back(trainedOrder_(window.signs));
-        set_.labels.push_back(label);
-    }
-    float anyRank() { return static_cast<float>(random_() >> 40); }
 
-    /// The window closest to each labelled place.
-    std::vector<Signs> trueWindows(const std::vector<LabelledFace>& faces) {
+    /// The window with the highest score at each labelled place of the dev split: as the finder takes the
+    /// best one, it is enough that this one passes.
+    std::vector<Signs> bestWindows(const TrainedSvm& svm) {
         std::vector<Signs> windows;
-        for (const LabelledFace& face : faces)
+        for (const LabelledFace& face : devFaces_)
             for (const Target& target : targets_(face, random_)) {
-                Window closest{Signs(), nearEnough, false};
+                Signs best;
+                double bestScore = -std::numeric_limits<double>::infinity();
                 forEachWindowOf(face, target, [&](const Window& window) {
-                    if (window.rightScale && window.distance < closest.distance) closest = window;
+                    if (!window.rightScale || window.distance > farEnough) return;
+                    const Signs trained = trainedOrder_(window.signs);
+                    if (const double score = svm.evaluate(trained); score > bestScore) {
+                        best = trained;
+                        bestScore = score;
+                    }
                 });
-                if (closest.rightScale) windows.push_back(trainedOrder_(closest.signs));
+                if (best.size() != 0) windows.push_back(best);
             }
         return windows;
     }
@@ -215,7 +208,7 @@ private:
     Random random_;
     TrainedOrder<Layout> trainedOrder_{static_cast<std::uint32_t>(
         Eye::Implementation::GSodConversion::trainedSize(Scan::columns, Scan::rows, 6))};
-    std::vector<LabelledFace> faces_;
+    std::vector<LabelledFace> faces_, devFaces_;
     SignSet set_;
 };
 
@@ -225,18 +218,14 @@ std::vector<Target> eyeTargets(const LabelledFace& face, Random& random) {
             {areas.second, face.rightEye, face.eyeDistance()}};
 }
 
-/// One area as it is, one mirrored.
+/// One area, mirrored at random.
 std::vector<Target> placedTarget(const LabelledFace& face, const std::optional<FNPos>& feature,
                                  const Placement& placement, Random& random) {
     if (!feature) return {};
-    std::vector<Target> targets;
-    for (const bool mirrored : {false, true}) {
-        const EyePair eyes = jitteredEyes(face, random);
-        SearchArea area = placement.area(eyes.first.pos, eyes.second.pos);
-        if (mirrored) area = {area.origin + area.u, -area.u, area.v};
-        targets.push_back({area, *feature, face.eyeDistance()});
-    }
-    return targets;
+    const EyePair eyes = jitteredEyes(face, random);
+    SearchArea area = placement.area(eyes.first.pos, eyes.second.pos);
+    if (random() % 2 == 0) area = {area.origin + area.u, -area.u, area.v};
+    return {{area, *feature, face.eyeDistance()}};
 }
 
 template <class Scan>
