@@ -1,6 +1,7 @@
 // Converts an image file into another format: convert <input> <output>
 //
-// The input is of any format that the library reads; the ending of the output's name chooses what is written.
+// The input is of any format that the library reads, told apart by its first bytes; only JPEG-LS, which begins like
+// JPEG, is told by its ending. The ending of the output's name chooses what is written.
 // Attributes are kept by PGM and PPM files.
 
 #include "fn/imagefile/bmp.h"
@@ -39,8 +40,19 @@ constexpr std::array formats{
     Format{"ppm", [](const auto& image, auto& file) { Fn::writePpm(image, file); }},
 };
 
+std::string endingOf(const std::string& fileName) {
+    return fileName.substr(fileName.rfind('.') + 1);
+}
+
+FNImageReference read(const std::string& fileName) {
+    if (endingOf(fileName) != "jls") return Fn::readImage(fileName);
+    std::ifstream file(fileName, std::ios::binary);
+    if (!file) FN_THROW(FNEBadArg, "Could not open file: " + fileName);
+    return Fn::readJpegLS(file);
+}
+
 const Format& formatOf(const std::string& fileName) {
-    const std::string ending = fileName.substr(fileName.rfind('.') + 1);
+    const std::string ending = endingOf(fileName);
     const auto format =
         std::find_if(formats.begin(), formats.end(), [&](const Format& f) { return ending == f.ending; });
     if (format != formats.end()) return *format;
@@ -58,7 +70,7 @@ int main(int argc, char** argv) {
     }
     try {
         const Format& format = formatOf(argv[2]);
-        const FNImageReference image = Fn::readImage(argv[1]);
+        const FNImageReference image = read(argv[1]);
         std::ofstream file(argv[2], std::ios::binary);
         if (!file) FN_THROW(FNEIOError, std::string("cannot write ") + argv[2]);
         format.write(image, file);

@@ -1,14 +1,10 @@
 #include "train/face_training.h"
 
 #include "eye/cara/combined_cascade.h"
-#include "eye/cara/face_finder.h"
 #include "eye/cara/face_pyramid.h"
 #include "eye/cara/sod_image.h"
+#include "eye/face_finder.h"
 #include "eye/gabor/window_convolver.h"
-#include "eye/neighbour_clustering.h"
-#include "fn/deployment/app_config_db.h"
-#include "fn/image_reference.h"
-#include "fn/image_representation.h"
 #include "img/scaling_table.h"
 #include "train/discriminator_training.h"
 #include "train/face_samples.h"
@@ -304,58 +300,10 @@ private:
     }
 
     void trainFinal() {
-        std::vector<Signs> faces = finalFaces(faces_, 1), others = candidates_.vectors();
-        const std::vector<Signs> devFaces = finalFaces(devFaces_, 2);
-        TrainedSvm svm = growPolynomial(join(faces, others), {{200}, 0.1f}, random_);
+        const std::vector<Signs> faces = finalFaces(faces_, 1), devFaces = finalFaces(devFaces_, 2);
+        TrainedSvm svm = growPolynomial(join(faces, candidates_.vectors()), {{200}, 0.1f}, random_);
         setWorkingPoint(svm, devFaces, disc3ASteps);
         save(svm, out_ / "gs2323fc.dat");
-
-        // A second round with what the finder as it stands reports, with a threshold below the final one.
-        collectFound(faces, others);
-        svm = growPolynomial(join(faces, others), {{200}, 0.1f}, random_);
-        setWorkingPoint(svm, devFaces, disc3ASteps);
-        save(svm, out_ / "gs2323fc.dat");
-    }
-
-    /// Adds what the finder finds on face pictures and backgrounds, by whether it is the labelled face.
-    void collectFound(std::vector<Signs>& faces, std::vector<Signs>& others) {
-        const FNCountedPtr<AppConfigDB> db(new AppVolatileConfigDB);
-        db->set("F.TemplatePath", out_.string());
-        db->set("F.Disc3A.Cascade.200", "-1.2");
-        const T8::FaceFinder finder(Fn::Deployment::Component(
-            db, Fn::Deployment::Property(Fn::Deployment::type<T8::FaceFinder>(), "F", "", "", false)));
-        const auto visit = [&](const Image& image, const auto& place) {
-            std::list<FaceFinder::Location> found;
-            finder.find(FNImageReferenceFactory::create(image), found, windowEyeDistance / image.w(), 0.5,
-                        FaceFinder::everywhere);
-            for (const FaceFinder::Location& location : found) {
-                const float k = 0.35888943f * location.width;
-                const FNPos centre = location.pos + FNPos{-k * std::sin(location.rotationAngle),
-                                                          k * std::cos(location.rotationAngle)};
-                place(location, finalSigns(image, centre, location.width, location.rotationAngle));
-            }
-        };
-        std::size_t hits = 0, misses = 0;
-        for (const Image& image : backgrounds_)
-            visit(image, [&](const FaceFinder::Location&, const Signs& signs) {
-                others.push_back(signs);
-                ++misses;
-            });
-        for (const FacePicture& face : faces_)
-            visit(face.image, [&](const FaceFinder::Location& location, const Signs& signs) {
-                const float distance = length(face.rightEye - face.leftEye);
-                const float off = length(location.pos - (face.leftEye + face.rightEye) / 2.0f) / distance;
-                const float ratio = location.width / distance;
-                if (off < 0.25f && ratio > 0.75f && ratio < 1.33f) {
-                    faces.push_back(signs);
-                    ++hits;
-                } else if (off > 0.5f || ratio < 0.6f || ratio > 1.6f) {
-                    others.push_back(signs);
-                    ++misses;
-                }
-            });
-        std::printf("  the finder reports %zu of %zu faces, and %zu other places\n", hits, faces_.size(),
-                    misses);
     }
 
     std::filesystem::path data_, out_;
