@@ -97,7 +97,7 @@ public:
         constexpr std::size_t vectorsOfRounds[] = {60, 120};
         faces_ = loadLabelledFaces(data, Labelled::Split::train, mostFaces, smallShare, random_);
         devFaces_ = loadLabelledFaces(data, Labelled::Split::dev, mostDevFaces, smallShare, random_);
-        collect(2, [&](const Signs&) { return anyRank(); });
+        collect(2, [&](const Signs&) { return static_cast<float>(random_() >> 40); });
         for (const std::size_t vectors : vectorsOfRounds) {
             const Discriminator discriminator(grown(vectors), {"round", {}});
             const float threshold = static_cast<float>(steps_.back().threshold) - 0.5f;
