@@ -1,6 +1,7 @@
 #include "eye/discriminator/sod_conversion.h"
 #include "eye/gabor/window_convolver.h"
 #include "eye/gabor/windowing_iterator.h"
+#include "eye/window_signs.h"
 #include "support/each_target.h"
 #include "support/thrown_text.h"
 
@@ -210,28 +211,6 @@ using AllSettings =
     testing::Types<Ojo::T8::ConvolverSettings<18, 18>, Ojo::T8::ConvolverSettings<22, 22>,
                    Ojo::T8::ConvolverSettings<25, 25>, Boca::MConvolverSettings, Raiz::MConvolverSettings>;
 TYPED_TEST_SUITE(PatchOf, AllSettings);
-
-/// Signs of a single window of any number of points, by the plain form.
-Fn::SignValueVector<int> windowSigns(const Image& patch, FNGridPos pos, std::uint32_t columns,
-                                     std::uint32_t rows) {
-    Gabor::Responses r(6, columns, rows);
-    Gabor::Plain::computeResponses(Gabor::kernelRep<6>(), patch.row(pos.y) + pos.x, patch.w(), 2, r);
-    namespace Conversion = Implementation::GSodConversion;
-    Fn::SVVectorSequentialBuilder<int> builder(
-        static_cast<std::uint32_t>(Conversion::trainedSize(columns, rows, 6)));
-    std::vector<std::int32_t> codes(16);
-    for (std::uint32_t x = 0; x < columns; ++x)
-        for (std::uint32_t y = 0; y < rows; ++y)
-            for (unsigned d = 0; d < 6; ++d) {
-                Gabor::Plain::compareInWindow(r, d, y, codes.data());
-                for (unsigned bit = 0; bit < 10; ++bit) {
-                    const bool needsRight = bit < 6, needsDown = bit >= 2 && bit < 8;
-                    if ((x + 1 == columns && needsRight) || (y + 1 == rows && needsDown)) continue;
-                    builder.setNextSign(codes[x] >> bit & 1);
-                }
-            }
-    return builder.vector();
-}
 
 TYPED_TEST(PatchOf, WindowsHaveTheBitsOfTheSingleWindowAtTheirPlace) {
     constexpr std::uint32_t C = TypeParam::windowColumns, R = TypeParam::windowRows;

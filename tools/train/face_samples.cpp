@@ -23,8 +23,8 @@ bool nearProfile(const Labelled::Row& row) {
 
 } // namespace
 
-std::vector<FacePicture> loadFaces(const std::filesystem::path& data, Labelled::Split split, std::size_t most,
-                                   Random& random) {
+std::vector<Labelled::Row> faceRows(const std::filesystem::path& data, Labelled::Split split,
+                                    std::size_t most, Random& random) {
     std::vector<Labelled::Row> rows;
     for (const char* folder : faceFolders)
         for (const Labelled::Row& row : Labelled::readLabels(data / folder / "labels.tsv")) {
@@ -34,8 +34,13 @@ std::vector<FacePicture> loadFaces(const std::filesystem::path& data, Labelled::
         }
     std::shuffle(rows.begin(), rows.end(), random);
     if (rows.size() > most) rows.erase(rows.begin() + static_cast<std::ptrdiff_t>(most), rows.end());
+    return rows;
+}
+
+std::vector<FacePicture> loadFaces(const std::filesystem::path& data, Labelled::Split split, std::size_t most,
+                                   Random& random) {
     std::vector<FacePicture> faces;
-    for (const Labelled::Row& row : rows)
+    for (const Labelled::Row& row : faceRows(data, split, most, random))
         faces.push_back({Fn::readImage(row.image().string()).toMono16(), *row.position("eye_left"),
                          *row.position("eye_right")});
     return faces;

@@ -15,6 +15,11 @@ struct FacePicture {
     FNPos leftEye, rightEye;
 };
 
+/// The rows of one split in the face folders below `data`, in random order: both eyes labelled, not too close
+/// to each other, no profile.
+std::vector<Labelled::Row> faceRows(const std::filesystem::path& data, Labelled::Split split,
+                                    std::size_t most, Random& random);
+
 /// All faces of one split in the face folders below `data`, and the pictures without a face.
 std::vector<FacePicture> loadFaces(const std::filesystem::path& data, Labelled::Split split, std::size_t most,
                                    Random& random);

@@ -12,7 +12,6 @@
 
 #include <cmath>
 #include <cstdio>
-#include <fstream>
 #include <functional>
 #include <memory>
 
@@ -62,21 +61,6 @@ const Rotation rotations[] = {
      {{200, -0.21, 0.975}}},
 };
 constexpr float rotationSpread = 0.16f;
-
-CascadeSettings settingsOf(const std::string& file, const std::vector<WorkingStep>& steps) {
-    CascadeSettings settings{file, {}};
-    for (const WorkingStep& step : steps)
-        settings.cascade.push_back({std::to_string(step.vectors), static_cast<float>(step.threshold)});
-    return settings;
-}
-
-void save(const TrainedSvm& svm, const std::filesystem::path& file) {
-    std::ofstream stream(file, std::ios::binary);
-    if (!stream) FN_THROW(FNEIOError, "Cannot write " + file.string());
-    svm.write(stream);
-    std::printf("%s: %zu vectors\n", file.filename().c_str(), svm.supportVectors.size());
-    std::fflush(stdout);
-}
 
 /// A level of a picture with its border, as the finder scans it.
 struct ScannedLevel {

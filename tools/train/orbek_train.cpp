@@ -3,6 +3,8 @@
 #include "fn/exception.h"
 #include "fn/numeric/blas.h"
 #include "train/face_training.h"
+#include "train/feature_measurement.h"
+#include "train/feature_training.h"
 
 #include <CLI/CLI.hpp>
 
@@ -11,23 +13,36 @@
 int main(int argc, char** argv) {
     CLI::App app("Makes the model files of liborbek from labelled images.");
     app.require_subcommand(1);
-    std::string data, out;
+    std::string data, folder;
     std::uint64_t seed = 1;
     int threads = 2;
-    const auto common = [&](CLI::App* command) {
-        command->add_option("--data", data, "Root of the labelled images")
+    using Task =
+        void (*)(const std::filesystem::path& data, const std::filesystem::path& folder, std::uint64_t seed);
+    const auto command = [&](const char* name, const char* doc, const char* option, const char* optionDoc,
+                             Task task) {
+        CLI::App* const sub = app.add_subcommand(name, doc);
+        sub->add_option("--data", data, "Root of the labelled images")
             ->required()
             ->check(CLI::ExistingDirectory);
-        command->add_option("--out", out, "Folder that gets the model files")->required();
-        command->add_option("--seed", seed, "Seed of all random choices")->capture_default_str();
-        command->add_option("--threads", threads, "Threads of the linear algebra")->capture_default_str();
+        sub->add_option(option, folder, optionDoc)->required();
+        sub->add_option("--seed", seed, "Seed of all random choices")->capture_default_str();
+        sub->add_option("--threads", threads, "Threads of the linear algebra")->capture_default_str();
+        sub->callback([&, task] {
+            Fn::Numeric::setBlasThreads(threads);
+            task(data, folder, seed);
+        });
     };
-    CLI::App* const face = app.add_subcommand("face", "The eleven files of the face finder");
-    common(face);
-    CLI11_PARSE(app, argc, argv);
+    const auto training = [&](const char* name, const char* doc, Task task) {
+        command(name, doc, "--out", "Folder that gets the model files", task);
+    };
+    training("face", "The eleven files of the face finder", Train::trainFaceFinder);
+    training("eyes", "The file of the eyes finder", Train::trainEyesFinder);
+    training("mouth", "The file of the mouth finder", Train::trainMouthFinder);
+    training("bridge", "The file of the nose bridge finder", Train::trainBridgeFinder);
+    command("measure-features", "Prints how well eyes, mouth and nose bridge are found on the test images",
+            "--etc", "Folder of the model files", Train::measureFeatureFinders);
     try {
-        Fn::Numeric::setBlasThreads(threads);
-        if (face->parsed()) Train::trainFaceFinder(data, out, seed);
+        CLI11_PARSE(app, argc, argv);
     } catch (const std::exception& e) {
         std::cerr << "orbek-train: " << e.what() << "\n";
         return 1;

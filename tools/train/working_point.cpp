@@ -1,11 +1,16 @@
 #include "train/working_point.h"
 
+#include "fn/exception.h"
+
 #include <algorithm>
 #include <cmath>
+#include <cstdio>
+#include <fstream>
 
 namespace Train {
 namespace {
 
+using Eye::Implementation::CascadeSettings;
 using Eye::Implementation::TrainedSvm;
 
 double kernel(const TrainedSvm& svm, const Signs& x, const Signs& vector) {
@@ -43,6 +48,21 @@ void setWorkingPoint(TrainedSvm& svm, const std::vector<Signs>& faces,
     }
     for (float& alpha : svm.alphas) alpha = static_cast<float>(alpha * gain);
     svm.bias = static_cast<float>(gain * reached.back() - steps.back().threshold);
+}
+
+CascadeSettings settingsOf(const std::string& file, const std::vector<WorkingStep>& steps) {
+    CascadeSettings settings{file, {}};
+    for (const WorkingStep& step : steps)
+        settings.cascade.push_back({std::to_string(step.vectors), static_cast<float>(step.threshold)});
+    return settings;
+}
+
+void save(const TrainedSvm& svm, const std::filesystem::path& file) {
+    std::ofstream stream(file, std::ios::binary);
+    if (!stream) FN_THROW(FNEIOError, "Cannot write " + file.string());
+    svm.write(stream);
+    std::printf("%s: %zu vectors\n", file.filename().c_str(), svm.supportVectors.size());
+    std::fflush(stdout);
 }
 
 } // namespace Train

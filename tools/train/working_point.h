@@ -1,8 +1,10 @@
 #pragma once
 
+#include "eye/discriminator/cascade_settings.h"
 #include "eye/discriminator/trained_svm.h"
 #include "train/sign_matrix.h"
 
+#include <filesystem>
 #include <vector>
 
 namespace Train {
@@ -19,5 +21,12 @@ struct WorkingStep {
 /// last step; an earlier step that cannot be met as well lets more pass.
 void setWorkingPoint(Eye::Implementation::TrainedSvm& svm, const std::vector<Signs>& faces,
                      const std::vector<WorkingStep>& steps);
+
+/// The cascade of these steps.
+Eye::Implementation::CascadeSettings settingsOf(const std::string& file,
+                                                const std::vector<WorkingStep>& steps);
+
+/// @throws FNEIOError naming the file if it cannot be written
+void save(const Eye::Implementation::TrainedSvm& svm, const std::filesystem::path& file);
 
 } // namespace Train
