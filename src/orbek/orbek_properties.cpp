@@ -1,6 +1,7 @@
 #include "orbek/orbek_properties.h"
 
 #include "eye/cara/face_finder.h"
+#include "eye/ojo/eyes_finder.h"
 #include "fg/capture_types.h"
 #include "fn/deployment/composite_values.h"
 
@@ -52,7 +53,7 @@ struct CamControl {
 std::list<Property> members() {
     return properties(
         property<Eye::Cara::T8::FaceFinder>::create("FaceFinder", "Face Finder"),
-        pending("EyesFinder", "Eye::Ojo::T8::EyesFinder", "Eyes Finder to use."),
+        property<Eye::Ojo::T8::EyesFinder>::create("EyesFinder", "Eyes Finder to use."),
         property<ComparisonModule>::create("ComparisonAlgorithm", "Type of Comparison Algorithm"),
         pending("SetEnroller", "Kx::SetEnroller", "Set Enroller"),
         pending("StreamEnroller", "Kx::StreamEnroller", "Stream Enroller"),

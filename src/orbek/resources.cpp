@@ -1,6 +1,7 @@
 #include "orbek/resources.h"
 
 #include "eye/cara/face_finder.h"
+#include "eye/ojo/eyes_finder.h"
 #include "fn/message/translator.h"
 #include "orbek/orbek_properties.h"
 
@@ -22,6 +23,12 @@ Component Resources::rootComponent() const {
 FaceFinder Resources::faceFinder() const {
     return FaceFinder(faceFinder_.get(mutex_, FNTrans("Face finder"), [&] {
         return new Eye::Cara::T8::FaceFinder(rootComponent_.subComponent("FaceFinder"));
+    }));
+}
+
+EyesFinder Resources::eyesFinder() const {
+    return EyesFinder(eyesFinder_.get(mutex_, FNTrans("Eyes finder"), [&] {
+        return new Eye::Ojo::T8::EyesFinder(rootComponent_.subComponent("EyesFinder"));
     }));
 }
 

@@ -1,5 +1,6 @@
 #pragma once
 
+#include "eye/eyes_finder.h"
 #include "eye/face_finder.h"
 #include "fn/deployment/app_config_db.h"
 #include "fn/deployment/component.h"
@@ -41,6 +42,7 @@ public:
     /// The engines. The first request reads the model files, and is slow.
     /// @throws FNEGeneric "<engine> : <reason>" if one cannot be made
     FaceFinder faceFinder() const;
+    EyesFinder eyesFinder() const;
 
 private:
     /// Held while an engine is made; recursive, since making one engine may ask for another.
@@ -48,6 +50,7 @@ private:
     FNCountedPtr<AppConfigDB> configDb_;
     Fn::Deployment::Component rootComponent_;
     MadeOnce<FaceFinder::Body> faceFinder_;
+    MadeOnce<EyesFinder::Body> eyesFinder_;
 };
 
 } // namespace Orbek

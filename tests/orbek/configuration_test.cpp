@@ -111,6 +111,17 @@ TEST(Resources, MissingModelsAreNamedWithTheirPath) {
     const std::string failure = thrownBy([&] { implementation->resources().faceFinder(); });
     EXPECT_EQ(failure.rfind("FNEGeneric: Face finder : ", 0), 0u) << failure;
     EXPECT_NE(failure.find("/no/such/etc/cara/"), std::string::npos) << failure;
+    const std::string eyes = thrownBy([&] { implementation->resources().eyesFinder(); });
+    EXPECT_EQ(eyes.rfind("FNEGeneric: Eyes finder : ", 0), 0u) << eyes;
+    EXPECT_NE(eyes.find("/no/such/etc/ojo/eyedisc.dat"), std::string::npos) << eyes;
+}
+
+TEST(ResourcesWithModels, FindersAreMadeOnceFromTheInstallationFolder) {
+    const Orbek::Configuration configuration =
+        fromText(std::string("ORBEK.Substitutions.INSTALLDIR = ") + ORBEK_BINARY_DIR + "\n");
+    const auto implementation = Orbek::Configuration::Implementation::implementation(configuration);
+    EXPECT_EQ(implementation->resources().faceFinder().processingId(), "T8FF");
+    EXPECT_NO_THROW(implementation->resources().eyesFinder());
 }
 
 TEST(PublicHandle, FollowsTheSameRulesAsTheInnerOne) {
