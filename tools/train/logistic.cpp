@@ -1,8 +1,6 @@
 #include "train/logistic.h"
 
-#include "fn/exception.h"
 #include "fn/numeric/blas.h"
-#include "fn/numeric/lapack.h"
 
 #include <algorithm>
 #include <cmath>
