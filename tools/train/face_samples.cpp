@@ -1,5 +1,6 @@
 #include "train/face_samples.h"
 
+#include "eye/cara/window_geometry.h"
 #include "fn/imagefile/image_file.h"
 #include "img/affine/transform.h"
 
@@ -9,8 +10,6 @@
 namespace Train {
 namespace {
 
-/// From the line of the eyes to the middle of the face finder's window, in eye distances.
-constexpr float eyeLineToCentre = 0.35888943f;
 /// Closer eyes are no good example.
 constexpr float leastEyeDistance = 14;
 
@@ -69,7 +68,7 @@ FNImage<unsigned short> facePatch(const FacePicture& face, std::uint32_t pixels,
     const FNPos u = FNPos{std::cos(angle), std::sin(angle)} * side, v{-u.y, u.x};
     const FNPos down = FNPos{-across.y, across.x};
     const float pixel = 1 / static_cast<float>(pixels);
-    const FNPos centre = (face.leftEye + face.rightEye) / 2.0f + down * eyeLineToCentre +
+    const FNPos centre = (face.leftEye + face.rightEye) / 2.0f + down * Eye::Cara::T8::eyeLineToCentre +
                          u * (jitter.position * unit(random) * pixel) +
                          v * (jitter.position * unit(random) * pixel);
     const FNPos corner = centre - u / 2.0f - v / 2.0f;

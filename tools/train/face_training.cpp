@@ -3,6 +3,7 @@
 #include "eye/cara/combined_cascade.h"
 #include "eye/cara/face_pyramid.h"
 #include "eye/cara/sod_image.h"
+#include "eye/cara/window_geometry.h"
 #include "eye/face_finder.h"
 #include "eye/gabor/window_convolver.h"
 #include "img/scaling_table.h"
@@ -28,7 +29,7 @@ using WindowConvolver =
 using FinalConvolver =
     Impl::FastSpatialGaborConvolver<unsigned short, int, Impl::SpatialGaborConvolverSettings_T8_FinalDecider>;
 
-constexpr float windowEyeDistance = 7, finalEyeDistance = 10;
+constexpr float windowEyeDistance = T8::trainedEyeDistance, finalEyeDistance = T8::finalEyeDistance;
 constexpr std::uint32_t windowPixels = 17, finalPixels = 23;
 
 /// The window's scale is at most the root of 4/3 off, and its place half a pixel.
@@ -70,10 +71,9 @@ struct ScannedLevel {
 };
 
 template <class Visit> void forEachLevel(const Image& image, Visit visit) {
-    constexpr double scaleStepRoot = 1.154700538379;
     const double largest = std::max(2.0, image.w() * 0.5);
     const std::list<float> scales = Img::createScalingTable(
-        windowEyeDistance, scaleStepRoot, windowEyeDistance, std::max(largest, 8.0), 0.0, true);
+        windowEyeDistance, T8::scaleStepRoot, windowEyeDistance, std::max(largest, 8.0), 0.0, true);
     const T8::Pyramid pyramid(image, scales.front(), scales.size());
     for (const auto& level : pyramid) {
         const auto bordered = T8::addBorder(level, FaceFinder::everywhere);
@@ -231,8 +231,9 @@ private:
                         const FNGridPos at{static_cast<std::int32_t>(x), static_cast<std::int32_t>(y)};
                         if (!accept(window) || !last(convolver.getGaborSODs(level.bordered.image, at), score))
                             continue;
-                        const FNPos centre = level.bordered.mapping(
-                            {static_cast<float>(x) + 8.5f, static_cast<float>(y) + 8.5f});
+                        const FNPos centre =
+                            level.bordered.mapping({static_cast<float>(x) + T8::windowCentre,
+                                                    static_cast<float>(y) + T8::windowCentre});
                         candidates_.offer(
                             [&] { return finalSigns(image, centre, level.eyeDistance, rotation.angle); });
                     }

@@ -5,6 +5,7 @@
 #include "eye/cara/frame_scale_sequencer.h"
 #include "eye/cara/overlap_removal.h"
 #include "eye/cara/sod_image.h"
+#include "eye/cara/window_geometry.h"
 #include "eye/gabor/window_convolver.h"
 #include "eye/neighbour_clustering.h"
 #include "fn/deployment/composite_values.h"
@@ -32,17 +33,7 @@ using FinalConvolver =
 
 namespace {
 
-/// Eye distance in the window of 17 by 17 pixels.
-constexpr float trainedEyeDistance = 7.0f;
-/// Its square is the step of the scales, 4/3.
-constexpr double scaleStepRoot = 1.154700538379;
-/// Centre of the window.
-constexpr float windowCentre = 8.5f;
-/// Side of the square of the final test in eye distances: 23 pixels, of which the eyes are 10 apart.
-constexpr float finalPatchSide = 2.3f;
 constexpr std::uint32_t finalPatchPixels = Impl::SpatialGaborConvolverSettings_T8_FinalDecider::mask;
-/// From the middle of the window to the line of the eyes, in eye distances.
-constexpr float centreToEyeLine = 0.35888943f;
 
 /// A window that passed the first stages, with bit i set for rotation i.
 struct PosWithOrientations {
@@ -244,7 +235,7 @@ bool FaceFinder::Impl::find(const FNImageReference& image, Locations& locations,
     clusters.computeClusterRepresentations(candidates);
     for (const Location& face : removeOverlaps(finalTest(mono, candidates))) {
         sequencer.markFace(face.pos, face.width);
-        const float k = centreToEyeLine * face.width;
+        const float k = eyeLineToCentre * face.width;
         Location result = face;
         result.pos += {k * std::sin(face.rotationAngle), -k * std::cos(face.rotationAngle)};
         locations.push_back(result);
