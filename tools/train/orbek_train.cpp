@@ -4,6 +4,7 @@
 #include "fn/numeric/blas.h"
 #include "train/face_training.h"
 #include "train/feature_training.h"
+#include "train/synth_training.h"
 
 #include <CLI/CLI.hpp>
 
@@ -34,6 +35,17 @@ int main(int argc, char** argv) {
     training("eyes", "The file of the eyes finder", Train::trainEyesFinder);
     training("mouth", "The file of the mouth finder", Train::trainMouthFinder);
     training("bridge", "The file of the nose bridge finder", Train::trainBridgeFinder);
+    training("synth", "The model of sample people who do not exist", Train::trainSynth);
+    std::string samples;
+    CLI::App* const measure = app.add_subcommand(
+        "measure-synth", "How far sample portraits are from the photos that their model learned from");
+    measure->add_option("--data", data, "Root of the labelled images")
+        ->required()
+        ->check(CLI::ExistingDirectory);
+    measure->add_option("--samples", samples, "Label file of the portraits")
+        ->required()
+        ->check(CLI::ExistingFile);
+    measure->callback([&] { Train::measureSynth(data, samples); });
     try {
         CLI11_PARSE(app, argc, argv);
     } catch (const std::exception& e) {

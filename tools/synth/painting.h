@@ -1,0 +1,23 @@
+#pragma once
+
+#include "synth/face_mesh.h"
+
+#include <cstdint>
+
+/// What drawn surfaces are made of.
+
+namespace Synth {
+
+/// 0 up to `from`, 1 from `to` on, smooth between; falls if `to` is smaller.
+float smoothStep(float from, float to, float x);
+
+/// Noise between -1 and 1 that is smooth over distances of about 1.
+float noise(float x, float y, std::uint32_t seed);
+
+/// Corners of a curve that passes through the corners of a closed polygon (Catmull-Rom).
+Points smoothed(const Points& polygon);
+
+/// Distance to the closed polygon, positive inside.
+float depth(const Points& polygon, FNPos p);
+
+} // namespace Synth
