@@ -15,6 +15,7 @@ write_basic_package_version_file(${packages}/orbek-config-version.cmake COMPATIB
 install(FILES ${packages}/orbek-config.cmake ${packages}/orbek-config-version.cmake DESTINATION ${package_folder})
 
 file(RELATIVE_PATH ORBEK_PREFIX_FROM_PC /${CMAKE_INSTALL_LIBDIR}/pkgconfig /)
+string(REGEX REPLACE "/$" "" ORBEK_PREFIX_FROM_PC "${ORBEK_PREFIX_FROM_PC}")
 configure_file(cmake/orbek.pc.in ${packages}/orbek.pc @ONLY)
 install(FILES ${packages}/orbek.pc DESTINATION ${CMAKE_INSTALL_LIBDIR}/pkgconfig)
 
