@@ -3,53 +3,47 @@
 #include "eye/face_finder.h"
 #include "fn/serialize.h"
 
-/// A list of the position, itself a list of x and y, the eye distance, the confidence and the rotation.
-template <> struct Fn::Serializer<FaceFinder::Location> {
-    static Package pack(const FaceFinder::Location& location);
-    /// @throws FNEBadArg
-    static FaceFinder::Location unpack(const Package& package);
-};
-
 namespace Eye {
 
-/// Handle on an engine that follows faces through the frames of one video.
+/// Handle on an engine that follows the faces of a video.
 class FaceTracker {
 public:
-    /// A face in one frame. What is not known of it is undefined, and its accessor throws.
+    /// A face in a frame.
     class FaceInfo {
     public:
-        /// Nothing is defined but the identity.
-        explicit FaceInfo(const std::string& identity = {}) : identity_(identity) {}
-        /// @param distance from the camera, metres
+        FaceInfo() = default;
+        /// @param identity stays the same over the frames of one track
+        /// @param location where the face is; none if its width is 0
+        FaceInfo(const std::string& identity, const FaceFinder::Location& location)
+            : identity_(identity), location_(location) {}
+        /// @param distance from the camera in metres
         FaceInfo(const std::string& identity, const FaceFinder::Location& location, float distance)
             : identity_(identity), location_(location), distance_(distance), distanceDefined_(true) {}
-        /// @throws FNEBadArg if the package holds no face
-        explicit FaceInfo(const Fn::Package& package) : FaceInfo(Fn::PackageReader(package)) {}
+        /// @throws FNEBadArg
+        explicit FaceInfo(const Fn::Package& package);
 
-        /// A list of identity, location, distance, whether it is defined, velocity, pixel velocity, and
-        /// whether they are defined.
+        /// A list of identity, location, distance and whether it is defined, velocity, pixel velocity and
+        /// whether they are.
         Fn::Package serialize() const;
         explicit operator Fn::Package() const { return serialize(); }
 
-        /// Stays the same over the frames of one track.
         const std::string& identity() const { return identity_; }
-        /// @throws std::runtime_error if it is undefined: no face has an eye distance of 0
-        const FaceFinder::Location& location() const;
-        /// Metres. @throws std::runtime_error
-        float distanceFromCamera() const;
-        /// Metres per second. @throws std::runtime_error
-        float velocity() const;
-        /// Pixels per second. @throws std::runtime_error
-        float pixVelocity() const;
-        /// Defines both velocities.
+        bool hasLocation() const { return location_.width != 0; }
+
+        /// What is not defined fails with a std::runtime_error.
+        FaceFinder::Location location() const;
+        float distanceFromCamera() const; ///< metres
+        float velocity() const;           ///< metres per second
+        float pixVelocity() const;        ///< pixels per second
+
+        /// Defines both.
         void velocityInfo(float velocity, float pixVelocity);
-        /// Maps the location: position * factor + shift, eye distance * factor.
-        /// @throws std::runtime_error if there is no location
+        /// Makes this a face of an image in which pixel p is at factor * p + shift.
+        /// @throws std::runtime_error without a location
         void scaleshift(float factor, const FNPos& shift);
 
     private:
-        explicit FaceInfo(Fn::PackageReader reader);
-        const FaceFinder::Location& checkedLocation(const char* operation) const;
+        void demand(bool defined, const char* operation, const char* item) const;
 
         std::string identity_;
         FaceFinder::Location location_;
@@ -59,30 +53,30 @@ public:
         float pixVelocity_ = 0;
         bool velocityDefined_ = false;
     };
+
     using FaceInfos = Fn::SerializableList<FaceInfo>;
 
     class Body {
     public:
         virtual ~Body() = default;
-        /// The next frame. @param timeMs by the caller's clock, milliseconds
+        /// @param timeMs the caller's clock, milliseconds
         virtual void processFrame(const FNImageReference& image, const unsigned int& timeMs) = 0;
-        /// The next frame of a video with a constant frame rate.
+        /// The next frame of a video of constant rate.
         virtual void processFrame(const FNImageReference& image) = 0;
     };
 
     explicit FaceTracker(const FNCountedPtr<Body>& body) : body_(body) {}
 
-    void processFrame(const FNImageReference& image, const unsigned int& timeMs) const {
+    void processFrame(const FNImageReference& image, unsigned int timeMs) {
         body_->processFrame(image, timeMs);
     }
-    void processFrame(const FNImageReference& image) const { body_->processFrame(image); }
+    void processFrame(const FNImageReference& image) { body_->processFrame(image); }
 
 private:
     FNCountedPtr<Body> body_;
 };
 
-/// A copy in which each face is mapped by FaceInfo::scaleshift(): brings results on a reduced frame back to
-/// the full one.
+/// FaceInfo::scaleshift() of each face.
 FaceTracker::FaceInfos scaleshift(const FaceTracker::FaceInfos& faces, float factor, const FNPos& shift);
 
 } // namespace Eye

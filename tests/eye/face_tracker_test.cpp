@@ -170,7 +170,7 @@ TEST(ReferenceFaceTracker, RefusesSettingsOutOfRange) {
 }
 
 TEST(FaceInfo, TellsWhatIsUndefined) {
-    FaceInfo nothing("7f");
+    FaceInfo nothing("7f", FaceFinder::Location{});
     EXPECT_EQ(thrownBy([&] { nothing.location(); }),
               "std::exception: location(): location is undefined! (ID = 7f)");
     EXPECT_EQ(thrownBy([&] { nothing.scaleshift(2, {}); }),
