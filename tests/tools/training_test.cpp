@@ -25,6 +25,11 @@ TEST(Labels, RowsCarryTheirFields) {
     EXPECT_FALSE(rows[1].position("eye_left"));
     EXPECT_FALSE(rows[1].number("age")) << "a range is no number";
     EXPECT_EQ(rows[1].splitKey(), "helen_12") << "files cut from one photo stay together";
+    EXPECT_EQ(Labelled::Row("net_7876_12_1_0.jpg", {}).splitKey(), "net_7876_12");
+    EXPECT_EQ(Labelled::Row("net_7876__-20_1006_2.jpg", {}).splitKey(), "net_7876__-20_1006");
+    EXPECT_EQ(Labelled::Row("helen_12.jpg", {}).splitKey(), "helen_12");
+    EXPECT_EQ(Labelled::Row("26_1_1_20170116161105745.jpg", {}).splitKey(), "26_1_1_20170116161105745")
+        << "an age and a gender are no photo";
 
     scratch.write("short.tsv", "file\tage\na.jpg\n");
     EXPECT_EQ(thrownBy([&] { Labelled::readLabels(scratch.file("short.tsv")); }),
@@ -43,7 +48,7 @@ TEST(Labels, SplitsHaveTheirSharesAndStay) {
     EXPECT_EQ(Labelled::splitOf("helen_100032540"), Labelled::Split::dev);
     EXPECT_EQ(Labelled::splitOf("celeba_001719"), Labelled::Split::train);
     EXPECT_EQ(Labelled::splitOf("10001"), Labelled::Split::train);
-    EXPECT_EQ(Labelled::splitOf("net_7876"), Labelled::Split::test);
+    EXPECT_EQ(Labelled::splitOf("net_7876_8"), Labelled::Split::test);
 }
 
 TEST(OperatingCurve, CountsFacesAndFalseAlarmsFromTheTop) {
