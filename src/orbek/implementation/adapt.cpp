@@ -57,6 +57,16 @@ FNImageReference adapt(const Image& image) {
     return FNImageReference(FNCountedPtr<FNImageReference::Representation>(new ImageAdapter(image)));
 }
 
+std::pair<Image, Eyes::Location> adapt(const Cmp::Face& face) {
+    const FacialFeatureLocation left = face.leftEyeLocation(); // the first to be missed, if both are
+    return {adapt(face.image(), ""), adapt(left, face.rightEyeLocation())};
+}
+
+Cmp::Face adapt(const std::pair<Image, Eyes::Location>& imageWithEyes) {
+    const auto& [image, eyes] = imageWithEyes;
+    return Cmp::Face(adapt(image), leftEye(eyes), rightEye(eyes));
+}
+
 Fn::ReadImagePropertiesFeedback adapt(const ImageIO::PropertiesFeedback& feedback) {
     if (!feedback) return {};
     return Fn::ReadImagePropertiesFeedback(
