@@ -1,80 +1,129 @@
-// What the public finders cost beside their engines, and tracking in video.
+// Finding faces, eyes, mouth and nose bridge on photos of 640 by 480 pixels, one thread. The photos are those
+// named by ORBEK_PHOTOS, a folder with labels.tsv.
 
-#include "eye/face_finder.h"
+#include "eval/finder_access.h"
+#include "eval/pictures.h"
+#include "eval/yardsticks.h"
 #include "fn/image_reference.h"
-#include "orbek/face_tracker.h"
-#include "orbek/implementation/configuration_implementation.h"
+#include "fn/image_representation.h"
+#include "fn/imagefile/image_file.h"
+#include "img/affine/transform.h"
 
 #include <benchmark/benchmark.h>
 
-#include <random>
-#include <sstream>
-#include <vector>
+#include <cstdlib>
+#include <stdexcept>
 
 namespace {
 
-/// A camera's gray frame in the application's memory: structure and noise.
-class Frame final : public Orbek::ImageBody {
-public:
-    Frame(unsigned int w, unsigned int h, unsigned int seed) : w_(w), h_(h), pixels_(std::size_t{w} * h) {
-        std::mt19937 random(seed);
-        for (unsigned int y = 0; y < h; ++y)
-            for (unsigned int x = 0; x < w; ++x)
-                pixels_[std::size_t{y} * w + x] =
-                    static_cast<unsigned char>(40 + x * 90 / w + (x / 37 + y / 53) % 2 * 60 + random() % 12);
-    }
+constexpr std::uint32_t width = 640, height = 480;
+constexpr std::size_t mostPhotos = 30;
+constexpr double smallestEyes = 32.0 / width, largestEyes = 0.4;
+constexpr const char* etc = ORBEK_BENCH_ETC;
 
-    bool isColor() const override { return false; }
-    unsigned int width() const override { return w_; }
-    unsigned int height() const override { return h_; }
-    const unsigned char* grayScaleRepresentation() const override { return pixels_.data(); }
-    const Orbek::Rgb* colorRepresentation() const override { return nullptr; }
-    std::string name() const override { return "frame"; }
+/// The middle of the photo, filling the frame.
+FNImageReference framed(const FNImageReference& photo) {
+    const FNImage<unsigned char> source = photo.toMono8();
+    const float scale =
+        std::min(static_cast<float>(source.w()) / width, static_cast<float>(source.h()) / height);
+    const FNPos u{scale * width, 0}, v{0, scale * height};
+    const FNPos middle{static_cast<float>(source.w()) / 2, static_cast<float>(source.h()) / 2};
+    FNImage<unsigned char> frame(width, height);
+    Img::Affine::transform(source, frame, middle - u / 2.0f - v / 2.0f, u, v, true,
+                           static_cast<unsigned char>(0));
+    return FNImageReferenceFactory::create(frame);
+}
 
-private:
-    unsigned int w_, h_;
-    std::vector<unsigned char> pixels_;
-};
-
-const Orbek::Configuration& configuration() {
-    static const Orbek::Configuration instance = [] {
-        std::istringstream text("ORBEK.Substitutions.INSTALLDIR = " ORBEK_BINARY_DIR "\n");
-        return Orbek::Configuration(text);
+const std::vector<FNImageReference>& photos() {
+    static const std::vector<FNImageReference> all = [] {
+        const char* const folder = std::getenv("ORBEK_PHOTOS");
+        if (!folder) throw std::runtime_error("ORBEK_PHOTOS names no folder with labels.tsv");
+        Eval::Selection selection;
+        selection.labels = {std::string(folder) + "/labels.tsv"};
+        std::vector<FNImageReference> images;
+        const auto pictures = Eval::picturesOf(selection);
+        const std::size_t step = std::max<std::size_t>(pictures.size() / mostPhotos, 1);
+        for (std::size_t i = 0; i < pictures.size() && images.size() < mostPhotos; i += step)
+            images.push_back(framed(Fn::readImage(pictures[i].file.string())));
+        return images;
     }();
-    return instance;
+    return all;
 }
 
-constexpr float least = 0.1f, greatest = 0.4f;
-
-void publicFind1080p(benchmark::State& state) {
-    const Orbek::Face::Finder finder(configuration());
-    const Orbek::Image image(new Frame(1920, 1080, 1));
-    for (auto _ : state) benchmark::DoNotOptimize(finder.find(image, least, greatest, 0, 0, 1920, 1080));
-}
-BENCHMARK(publicFind1080p)->Unit(benchmark::kMillisecond);
-
-void engineFind1080p(benchmark::State& state) {
-    const FaceFinder finder =
-        Orbek::Configuration::Implementation::implementation(configuration())->resources().faceFinder();
-    const Frame frame(1920, 1080, 1);
-    FNImage<unsigned char> pixels(1920, 1080);
-    std::copy_n(frame.grayScaleRepresentation(), pixels.size(), pixels.getExclusive());
-    const FNImageReference image = FNImageReferenceFactory::create(pixels);
+void find(benchmark::State& state, const FaceFinder& finder) {
+    const std::vector<FNImageReference>& images = photos();
     std::list<FaceFinder::Location> faces;
     for (auto _ : state)
-        benchmark::DoNotOptimize(finder.find(image, faces, least, greatest, {0, 0, 1920, 1080}));
+        for (const FNImageReference& image : images)
+            finder.find(image, faces, smallestEyes, largestEyes, FaceFinder::everywhere);
+    state.counters["ms/photo"] =
+        benchmark::Counter(static_cast<double>(state.iterations() * images.size()) / 1000,
+                           benchmark::Counter::kIsRate | benchmark::Counter::kInvert);
 }
-BENCHMARK(engineFind1080p)->Unit(benchmark::kMillisecond);
 
-/// Items are frames.
-void trackExhaustively640x480(benchmark::State& state) {
-    Orbek::Face::Tracker tracker(configuration());
-    std::vector<Orbek::Image> frames;
-    for (unsigned int seed = 0; seed < 8; ++seed) frames.emplace_back(new Frame(640, 480, seed));
-    std::size_t next = 0;
-    for (auto _ : state) benchmark::DoNotOptimize(tracker.processFrame(frames[next++ % frames.size()]));
-    state.SetItemsProcessed(state.iterations());
+void findFaces(benchmark::State& state) {
+    find(state, Eval::makeFaceFinder(etc));
 }
-BENCHMARK(trackExhaustively640x480)->Unit(benchmark::kMillisecond);
+BENCHMARK(findFaces)->Unit(benchmark::kMillisecond);
+
+/// The same photo again and again, as of a camera before which little moves.
+void findFacesInStream(benchmark::State& state) {
+    const FaceFinder finder = Eval::makeFaceFinder(etc);
+    const std::vector<FNImageReference>& images = photos();
+    constexpr int frames = 30;
+    std::list<FaceFinder::Location> faces;
+    for (auto _ : state)
+        for (const FNImageReference& image : images)
+            for (int frame = 0; frame < frames; ++frame)
+                finder.findInStream(image, faces, smallestEyes, largestEyes, frame, FaceFinder::everywhere);
+    state.counters["ms/photo"] =
+        benchmark::Counter(static_cast<double>(state.iterations() * images.size()) * frames / 1000,
+                           benchmark::Counter::kIsRate | benchmark::Counter::kInvert);
+}
+BENCHMARK(findFacesInStream)->Unit(benchmark::kMillisecond);
+
+void findFeaturesOfAFace(benchmark::State& state) {
+    const FaceFinder finder = Eval::makeFaceFinder(etc);
+    const EyesFinder eyes = Eval::makeEyesFinder(etc, "Strict");
+    const MouthFinder mouth = Eval::makeMouthFinder(etc);
+    const BridgeFinder bridge = Eval::makeBridgeFinder(etc);
+    std::vector<std::pair<FNImageReference, FaceFinder::Location>> found;
+    for (const FNImageReference& image : photos()) {
+        std::list<FaceFinder::Location> faces;
+        if (finder.find(image, faces, smallestEyes, largestEyes, FaceFinder::everywhere))
+            found.emplace_back(image, faces.front());
+    }
+    FacialFeatureLocation first, second, feature;
+    bool foundFirst, foundSecond;
+    for (auto _ : state)
+        for (const auto& [image, face] : found) {
+            eyes.find(face, image, foundFirst, first, foundSecond, second);
+            if (!foundFirst || !foundSecond) continue;
+            mouth.find(first, second, image, feature);
+            bridge.find(first, second, image, feature);
+        }
+    state.counters["ms/face"] =
+        benchmark::Counter(static_cast<double>(state.iterations() * found.size()) / 1000,
+                           benchmark::Counter::kIsRate | benchmark::Counter::kInvert);
+}
+BENCHMARK(findFeaturesOfAFace)->Unit(benchmark::kMillisecond);
+
+void constructAllFinders(benchmark::State& state) {
+    for (auto _ : state) {
+        benchmark::DoNotOptimize(Eval::makeFaceFinder(etc));
+        benchmark::DoNotOptimize(Eval::makeEyesFinder(etc, "Strict"));
+        benchmark::DoNotOptimize(Eval::makeMouthFinder(etc));
+        benchmark::DoNotOptimize(Eval::makeBridgeFinder(etc));
+    }
+}
+BENCHMARK(constructAllFinders)->Unit(benchmark::kMillisecond);
+
+const int yardsticks = [] {
+    for (const std::string& name : Eval::yardstickNames())
+        benchmark::RegisterBenchmark(("findFaces/" + name).c_str(), [name](benchmark::State& state) {
+            find(state, *Eval::makeYardstick(name));
+        })->Unit(benchmark::kMillisecond);
+    return 0;
+}();
 
 } // namespace

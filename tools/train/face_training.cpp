@@ -15,6 +15,7 @@
 #include <cstdio>
 #include <functional>
 #include <memory>
+#include <optional>
 
 namespace Train {
 namespace {
@@ -115,6 +116,22 @@ struct Place {
         return level.bordered.mapping(
             {static_cast<float>(x) + T8::windowCentre, static_cast<float>(y) + T8::windowCentre});
     }
+};
+
+/// How much more than in use the last stage lets through where the final test learns.
+constexpr double relaxed = 0.35;
+
+std::vector<WorkingStep> relaxedSteps(std::vector<WorkingStep> steps) {
+    for (WorkingStep& step : steps) step.threshold -= relaxed;
+    return steps;
+}
+
+/// What a window passes on its way to the final test, for one rotation.
+struct TrainedRotation {
+    float angle;
+    T8::SodDotDiscriminator disc1B;
+    T8::SodPolynomialDiscriminator disc1C;
+    T8::GaborDiscriminator disc2A;
 };
 
 class FaceTraining {
@@ -226,24 +243,33 @@ private:
                                          {{200}, 0.1f}, random_);
         setWorkingPoint(svm2, gaborSigns(devFaces_, jitter, 2), rotation.disc2A);
         save(svm2, out_ / ("gs1717f" + name + ".dat"));
-        collectCandidates(rotation, passesAll,
-                          T8::GaborDiscriminator(svm2, settingsOf("2A", rotation.disc2A)));
+        rotations_.push_back({rotation.angle, discB, discC,
+                              T8::GaborDiscriminator(svm2, settingsOf("2A", relaxedSteps(rotation.disc2A)))});
     }
 
-    /// Keeps what passes all stages of a rotation on background, as the final test will see it.
-    void collectCandidates(const Rotation& rotation, const Accept& accept,
-                           const T8::GaborDiscriminator& last) {
+    /// What passes the stages of a rotation on background, the last one nearly, as the final test sees it.
+    /// @param most so many at random
+    std::vector<Signs> mineFinal(std::size_t most) {
         const WindowConvolver convolver;
-        std::size_t before = candidates_.seen();
+        Reservoir reservoir(most, random_);
+        Signs window(SodImage::windowBits);
         float score;
-        forEachBackground(1, accept, [&](const Place& place) {
-            if (last(convolver.getGaborSODs(place.level.bordered.image, place.gridPos()), score))
-                candidates_.offer([&] {
-                    return finalSigns(place.scenery.image, place.centre(), place.level.eyeDistance,
-                                      rotation.angle);
-                });
+        const Accept passesA = [&](const Signs& sods) { return (*first_)(sods, score); };
+        forEachBackground(1, passesA, [&](const Place& place) {
+            place.level.sods.getWindow(place.x, place.y, window.exclusiveBytes());
+            std::optional<Signs> gabor;
+            for (const TrainedRotation& rotation : rotations_) {
+                if (!rotation.disc1B(window, score) || !rotation.disc1C(window, score)) continue;
+                if (!gabor) gabor = convolver.getGaborSODs(place.level.bordered.image, place.gridPos());
+                if (rotation.disc2A(*gabor, score))
+                    reservoir.offer([&] {
+                        return finalSigns(place.scenery.image, place.centre(), place.level.eyeDistance,
+                                          rotation.angle);
+                    });
+            }
         });
-        std::printf("  %zu background windows reach the final test\n", candidates_.seen() - before);
+        std::printf("  %zu background windows come to the final test\n", reservoir.seen());
+        return reservoir.vectors();
     }
 
     Signs finalSigns(const Image& image, FNPos centre, float eyeDistance, float angle) const {
@@ -257,7 +283,9 @@ private:
     TrainedSvm trainC(const Rotation& rotation, const std::vector<Signs>& faces,
                       const std::vector<Signs>& devFaces, const std::vector<Signs>& others) {
         TrainedSvm svm = growPolynomial(join(faces, others), {{15, 40, 300}, 0.1f}, random_);
-        setWorkingPoint(svm, devFaces, rotation.disc1C);
+        std::vector<Signs> windows = faces;
+        windows.insert(windows.end(), others.begin(), others.end());
+        setWorkingPoints(svm, devFaces, rotation.disc1C, windows);
         return svm;
     }
 
@@ -293,8 +321,9 @@ private:
     }
 
     void trainFinal() {
-        const std::vector<Signs> faces = finalFaces(faces_, 1), devFaces = finalFaces(devFaces_, 2);
-        TrainedSvm svm = growPolynomial(join(faces, candidates_.vectors()), {{200}, 0.1f}, random_);
+        constexpr std::size_t mostOthers = 80000;
+        const std::vector<Signs> faces = finalFaces(faces_, 2), devFaces = finalFaces(devFaces_, 2);
+        TrainedSvm svm = growPolynomial(join(faces, mineFinal(mostOthers)), {{200}, 0.1f}, random_);
         setWorkingPoint(svm, devFaces, disc3ASteps);
         save(svm, out_ / "gs2323fc.dat");
     }
@@ -302,7 +331,7 @@ private:
     std::filesystem::path data_, out_;
     Random random_;
     FinalConvolver finalConvolver_;
-    Reservoir candidates_{40000, random_};
+    std::vector<TrainedRotation> rotations_;
     std::vector<FacePicture> faces_, devFaces_;
     std::vector<Scenery> sceneries_;
     std::unique_ptr<T8::SodDotDiscriminator> first_;
