@@ -36,6 +36,14 @@ void* operator new(std::size_t size) {
 void* operator new[](std::size_t size) {
     return allocate(size);
 }
+// The sanitizers' own nothrow forms would not come from here.
+void* operator new(std::size_t size, const std::nothrow_t&) noexcept {
+    record.add(size);
+    return std::malloc(std::max<std::size_t>(size, 1));
+}
+void* operator new[](std::size_t size, const std::nothrow_t& tag) noexcept {
+    return operator new(size, tag);
+}
 void operator delete(void* memory) noexcept {
     std::free(memory);
 }
