@@ -7,6 +7,7 @@
 #include "support/thrown.h"
 #include "synth/painting.h"
 #include "synth/portrait.h"
+#include "train/synth_samples.h"
 
 #include <gtest/gtest.h>
 
@@ -135,11 +136,70 @@ TEST(PortraitWithModels, ControlsMoveTheLandmarksTheyAreNamedAfter) {
     EXPECT_NEAR(std::atan2(across.y, across.x), 0.3f, 0.01f);
 }
 
-/// The sample pictures of this repository.
+/// Of the sample pictures of this repository.
+const std::string sampleLabels = std::string(ORBEK_SOURCE_DIR) + "/examples/images/labels.tsv";
+
 std::vector<Eval::LabelledPicture> samples() {
     Eval::Selection selection;
-    selection.labels = {std::string(ORBEK_SOURCE_DIR) + "/examples/images/labels.tsv"};
+    selection.labels = {sampleLabels};
     return Eval::picturesOf(selection);
+}
+
+TEST(SynthSamples, AMirrorImageHasTheOtherSideOfEverything) {
+    const auto faces = Train::pointedFaces(sampleLabels, 0, {});
+    ASSERT_GE(faces.size(), 20u);
+    EXPECT_TRUE(Train::pointedFaces(sampleLabels, 200, {}).empty()) << "none is so large";
+    const TextureFrame frame(Train::meanShape(faces, 32));
+    const Points& mean = frame.mesh();
+    EXPECT_NEAR(HeadAxes(std::span(mean).first(landmarkCount)).eyeDistance(), 32, 1);
+    EXPECT_NEAR(mean[16].x - mean[8].x, mean[8].x - mean[0].x, 1e-2) << "symmetric";
+    const Train::PhotoWarper warper(frame);
+    for (std::size_t i = 0; i < faces.size(); i += 7) {
+        const auto [face, mirror] = warper.samples(faces[i]);
+        EXPECT_NEAR(face.controls[yaw], -mirror.controls[yaw], 1e-3);
+        EXPECT_NEAR(face.controls[smile], mirror.controls[smile], 1e-3);
+        EXPECT_NEAR(face.controls[lightSide], -mirror.controls[lightSide], 0.02);
+        const auto x = [](const Train::SynthSample& sample, std::size_t point) {
+            return sample.values[2 * point];
+        };
+        for (const auto& [point, other] : {std::pair{0, 16},
+                                           {17, 26},
+                                           {31, 35},
+                                           {36, 45},
+                                           {41, 46},
+                                           {48, 54},
+                                           {55, 59},
+                                           {60, 64},
+                                           {65, 67}})
+            EXPECT_NEAR(x(face, point) + x(mirror, other), 2 * mean[8].x, 0.01) << point;
+    }
+}
+
+TEST(HairRemoval, ReplacesOnTheForeheadWhatIsNoSkin) {
+    const auto faces = Train::pointedFaces(sampleLabels, 0, {});
+    const TextureFrame frame(Train::meanShape(faces, 32));
+    const Train::PhotoWarper warper(frame);
+    std::vector<Train::SynthSample> samples;
+    for (const Train::PointedFace& face : faces) samples.push_back(warper.samples(face).first);
+    Train::HairRemoval removal(frame);
+    removal.learn(samples);
+    Train::SynthSample fringe = samples.front();
+    const HeadAxes head(std::span(frame.mesh()).first(landmarkCount));
+    const auto meanOver = [&](const Train::SynthSample& sample, float from, float to) {
+        float sum = 0, n = 0;
+        for (std::size_t i = 0; i < frame.luma().size(); ++i)
+            if (const float y = head.local(FNPos(frame.luma()[i])).y; y > from && y < to) {
+                sum += sample.values[shapeSize + i];
+                n += 1;
+            }
+        return sum / n;
+    };
+    const float before = meanOver(fringe, -1, 0.2f);
+    for (std::size_t i = 0; i < frame.luma().size(); ++i)
+        if (head.local(FNPos(frame.luma()[i])).y > 0.65f) fringe.values[shapeSize + i] = 20;
+    removal.apply(fringe);
+    EXPECT_GT(meanOver(fringe, 0.75f, 0.9f), 80);
+    EXPECT_NEAR(meanOver(fringe, -1, 0.2f), before, 0.05f * before) << "and leaves the face alone";
 }
 
 bool findsTheOneFace(const FaceFinder& finder, const Eval::LabelledPicture& picture) {

@@ -32,6 +32,16 @@ float noise(float x, float y, std::uint32_t seed) {
     return std::lerp(upper, lower, ty);
 }
 
+float bilinear(const FNImage<float>& image, FNPos pos) {
+    const float x = std::clamp(pos.x - 0.5f, 0.0f, static_cast<float>(image.w()) - 1.001f);
+    const float y = std::clamp(pos.y - 0.5f, 0.0f, static_cast<float>(image.h()) - 1.001f);
+    const auto x0 = static_cast<std::uint32_t>(x), y0 = static_cast<std::uint32_t>(y);
+    const float fx = x - static_cast<float>(x0), fy = y - static_cast<float>(y0);
+    const float* const row = image.row(y0) + x0;
+    const float* const below = row + image.w();
+    return (row[0] * (1 - fx) + row[1] * fx) * (1 - fy) + (below[0] * (1 - fx) + below[1] * fx) * fy;
+}
+
 Points smoothed(const Points& polygon) {
     constexpr int steps = 4;
     const std::size_t n = polygon.size();

@@ -9,16 +9,6 @@
 namespace Synth {
 namespace {
 
-float bilinear(const FNImage<float>& image, FNPos pos) {
-    const float x = std::clamp(pos.x - 0.5f, 0.0f, static_cast<float>(image.w()) - 1.001f);
-    const float y = std::clamp(pos.y - 0.5f, 0.0f, static_cast<float>(image.h()) - 1.001f);
-    const auto x0 = static_cast<std::uint32_t>(x), y0 = static_cast<std::uint32_t>(y);
-    const float fx = x - static_cast<float>(x0), fy = y - static_cast<float>(y0);
-    const float* const row = image.row(y0) + x0;
-    const float* const below = row + image.w();
-    return (row[0] * (1 - fx) + row[1] * fx) * (1 - fy) + (below[0] * (1 - fx) + below[1] * fx) * fy;
-}
-
 /// The mean over a small window, as often as wanted.
 FNImage<float> blurred(FNImage<float> image, int times) {
     for (int round = 0; round < times; ++round) {
@@ -48,6 +38,11 @@ void sharpen(FNImage<float>& y) {
     for (std::size_t i = 0; i < y.size(); ++i) out[i] += amount * (out[i] - smooth.data()[i]);
 }
 
+/// Paints one portrait, layer over layer: background, hair behind, neck, clothes, ears, face, hair before.
+///
+/// Places are told in eye distances: `head` right of and above the middle of the eyes, tilted with the head;
+/// `body` right of and below where the eyes of an upright head are. Those of a picture are pixels.
+/// Proportions and shades are set by eye.
 class Painter {
 public:
     Painter(const PortraitModel& model, const Person& person, const View& view, std::uint32_t width);

@@ -3,6 +3,7 @@
 #include "fn/exception.h"
 #include "fn/imagefile/image_file.h"
 #include "img/affine/transform.h"
+#include "synth/painting.h"
 
 #include <algorithm>
 #include <cmath>
@@ -63,16 +64,6 @@ Synth::Controls measured(const Points& landmarks) {
     controls[Synth::eyesOpen] = (gap(p[37], p[41]) + gap(p[38], p[40])) / gap(p[36], p[39]) +
                                 (gap(p[43], p[47]) + gap(p[44], p[46])) / gap(p[42], p[45]);
     return controls;
-}
-
-float bilinear(const FNImage<float>& image, FNPos pos) {
-    const float x = std::clamp(pos.x - 0.5f, 0.0f, static_cast<float>(image.w()) - 1.001f);
-    const float y = std::clamp(pos.y - 0.5f, 0.0f, static_cast<float>(image.h()) - 1.001f);
-    const auto x0 = static_cast<std::uint32_t>(x), y0 = static_cast<std::uint32_t>(y);
-    const float fx = x - static_cast<float>(x0), fy = y - static_cast<float>(y0);
-    const float* const row = image.row(y0) + x0;
-    const float* const below = row + image.w();
-    return (row[0] * (1 - fx) + row[1] * fx) * (1 - fy) + (below[0] * (1 - fx) + below[1] * fx) * fy;
 }
 
 FNImage<float> flipped(const FNImage<float>& image) {
@@ -223,14 +214,14 @@ SynthSample PhotoWarper::sample(const Planes& planes) const {
     const FNPos shift{border, border};
     const auto w = static_cast<std::int32_t>(frame_.w()), h = static_cast<std::int32_t>(frame_.h());
     Synth::forEachPixel(frame_.triangles(), frame_.mesh(), mesh, {0, 0, w, h}, [&](FNGridPos at, FNPos from) {
-        luma[lumaIndex_[static_cast<std::size_t>(at.y * w + at.x)]] = bilinear(planes.y, from + shift);
+        luma[lumaIndex_[static_cast<std::size_t>(at.y * w + at.x)]] = Synth::bilinear(planes.y, from + shift);
     });
     Points half;
     for (const FNPos p : frame_.mesh()) half.push_back(p * 0.5f);
     Synth::forEachPixel(frame_.triangles(), half, mesh, {0, 0, w / 2, h / 2}, [&](FNGridPos at, FNPos from) {
         const std::size_t i = chromaIndex_[static_cast<std::size_t>(at.y * (w / 2) + at.x)];
-        cb[i] = bilinear(planes.cb, from + shift);
-        cb[i + chromaCount] = bilinear(planes.cr, from + shift);
+        cb[i] = Synth::bilinear(planes.cb, from + shift);
+        cb[i + chromaCount] = Synth::bilinear(planes.cr, from + shift);
     });
 
     result.controls = measured(planes.landmarks);

@@ -48,7 +48,7 @@ struct SynthSample {
     Synth::Controls controls;  ///< as measured, in no unit
 };
 
-/// Brings photos into the frame. Not to be used by two threads.
+/// Brings photos into the frame, which must outlive it.
 class PhotoWarper {
 public:
     explicit PhotoWarper(const Synth::TextureFrame& frame);
