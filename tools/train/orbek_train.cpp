@@ -2,6 +2,7 @@
 
 #include "fn/exception.h"
 #include "fn/numeric/blas.h"
+#include "train/calibration.h"
 #include "train/face_training.h"
 #include "train/feature_measurement.h"
 #include "train/feature_training.h"
@@ -41,6 +42,16 @@ int main(int argc, char** argv) {
     training("bridge", "The file of the nose bridge finder", Train::trainBridgeFinder);
     command("measure-features", "Prints how well eyes, mouth and nose bridge are found on the test images",
             "--etc", "Folder of the model files", Train::measureFeatureFinders);
+    std::string scores, algorithm;
+    CLI::App* const calibration = app.add_subcommand(
+        "calibrate", "The score and rate mapping files of a comparison algorithm, from scores of pairs");
+    calibration->add_option("--scores", scores, "Lines of \"genuine\" or \"impostor\" and a raw score")
+        ->required()
+        ->check(CLI::ExistingFile);
+    calibration->add_option("--algorithm", algorithm, "Ends the files' names: smap-ALGORITHM.dat")
+        ->required();
+    calibration->add_option("--out", folder, "Folder that gets the mapping files and a report")->required();
+    calibration->callback([&] { Train::calibrate(scores, algorithm, folder); });
     try {
         CLI11_PARSE(app, argc, argv);
     } catch (const std::exception& e) {
