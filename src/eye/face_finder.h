@@ -2,6 +2,7 @@
 
 #include "fn/cptr.h"
 #include "fn/geometry.h"
+#include "fn/serialize.h"
 
 #include <list>
 #include <string>
@@ -59,4 +60,11 @@ public:
 
 private:
     FNCountedPtr<Body> body_;
+};
+
+/// A list of the position, itself a list of x and y, the width, the confidence and the rotation angle.
+template <> struct Fn::Serializer<FaceFinder::Location> {
+    static Package pack(const FaceFinder::Location& location);
+    /// @throws FNEBadArg
+    static FaceFinder::Location unpack(const Package& package);
 };

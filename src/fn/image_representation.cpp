@@ -62,24 +62,6 @@ Reference::SerializationStrategy strategyOf(const std::string& name) {
     FN_THROW(FNEBadFormat, "FNImageReference: de-serialized invalid image serialization format marker");
 }
 
-Fn::Package packed(const FNImageAttributes& attributes) {
-    std::list<Fn::Package> elements;
-    for (const auto& [key, value] : attributes) {
-        elements.push_back(Fn::serialize(key));
-        elements.push_back(Fn::serialize(value));
-    }
-    return Fn::Package(elements);
-}
-
-FNImageAttributes unpackedAttributes(const Fn::Package& package) {
-    FNImageAttributes attributes;
-    for (Fn::PackageReader reader(package); !reader.atEnd();) {
-        const auto key = reader.next<std::string>();
-        attributes[key] = reader.next<std::string>();
-    }
-    return attributes;
-}
-
 Fn::Package packedBlock(const FNRMem<unsigned char>& block) {
     return Fn::Package(std::list{block});
 }
@@ -136,12 +118,12 @@ constexpr std::array readers{
 // ---- attributes and strategy
 
 AttributedImageRepresentation::AttributedImageRepresentation(Fn::PackageReader& elements)
-    : Representation(elements), attributes_(unpackedAttributes(elements.next<Fn::Package>())),
+    : Representation(elements), attributes_(elements.next<FNImageAttributes>()),
       strategy_(strategyOf(elements.next<std::string>())) {}
 
 void AttributedImageRepresentation::serialize(std::list<Fn::Package>& elements) const {
     Representation::serialize(elements);
-    elements.push_back(packed(attributes_));
+    elements.push_back(Fn::serialize(attributes_));
     elements.push_back(Fn::serialize(markerOf(strategy_)));
 }
 
