@@ -78,25 +78,6 @@ Fn::Optional<unsigned int> exposureTime(const Component& component) {
     return Value<UInt>::get(setting.subComponent(UInt::typeId()));
 }
 
-/// The same pixels with attributes that nobody else sees.
-FNImageReference separate(const FNImageReference& image) {
-    const auto of = [&](const auto& pixels) {
-        return FNImageReferenceFactory::create(pixels, image.attributes(), image.getSerializationStrategy());
-    };
-    switch (image.native()) {
-    case FNImageReference::MONO8:
-        return of(image.toMono8());
-    case FNImageReference::MONO16:
-        return of(image.toMono16());
-    case FNImageReference::MONO_FLOAT:
-        return of(image.toMonoFloat());
-    case FNImageReference::RGB48:
-        return of(image.toRgb48());
-    default:
-        return of(image.toBgra32());
-    }
-}
-
 [[noreturn]] void refuse(const char* setting) {
     FN_THROW(FNEBadFunCall, std::string("MultiFile: files have no ") + setting + " to set");
 }
@@ -121,7 +102,8 @@ public:
 
     FNImageReference grab() {
         const FNMutexLock lock(mutex_);
-        FNImageReference image = caching_ ? separate(cache_[nextImage_]) : read(files_[nextFile_]);
+        FNImageReference image =
+            caching_ ? FNImageReferenceFactory::duplicate(cache_[nextImage_]) : read(files_[nextFile_]);
         Fn::addImageCaptureTime(image.attributes(), nextCapture_);
         nextCapture_ = nextCapture_ + framePeriod_;
         advance(caching_ ? nextImage_ : nextFile_);
