@@ -1,7 +1,6 @@
 #pragma once
 
 #include <algorithm>
-#include <limits>
 #include <vector>
 
 namespace Cmp::Implementation {
@@ -10,7 +9,7 @@ namespace Cmp::Implementation {
 /// generation brings the class of its clusters.
 ///
 ///     struct Cluster {
-///         explicit Cluster(const Feature& centre);
+///         Cluster(const Feature& centre, const Argument&...);
 ///         float similarity(const Feature& feature) const;   // to the centre
 ///         void add(const Feature& feature);                 // to the sum
 ///         bool settle();  // moves the centre to the sum and forgets the sum; false if it moved
@@ -20,12 +19,15 @@ namespace Cmp::Implementation {
 /// first of equals; then clusters settle in their order up to the first one whose centre moves, and those
 /// behind it keep their sums for the next pass. It ends when no centre moves, or after 1000 passes.
 ///
+/// @param arguments for each cluster
 /// @return min(most, number of features) clusters
-template <class Cluster, class Feature>
-std::vector<Cluster> cluster(const std::vector<Feature>& features, std::size_t most) {
+template <class Cluster, class Feature, class... Argument>
+std::vector<Cluster> cluster(const std::vector<Feature>& features, std::size_t most,
+                             const Argument&... arguments) {
     constexpr int mostPasses = 1000;
     std::vector<Cluster> clusters;
-    for (std::size_t i = 0; i < std::min(most, features.size()); ++i) clusters.emplace_back(features[i]);
+    for (std::size_t i = 0; i < std::min(most, features.size()); ++i)
+        clusters.emplace_back(features[i], arguments...);
     if (clusters.empty()) return clusters;
     for (int pass = 0; pass < mostPasses; ++pass) {
         for (const Feature& feature : features) {
