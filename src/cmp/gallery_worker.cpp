@@ -5,19 +5,19 @@ namespace Cmp::Implementation {
 namespace {
 
 /// Keeps a match if it belongs to the best so far.
-void offer(const MatchLimits& limits, float score, const std::string& id, RawMatches& best) {
-    if (!(score > limits.threshold) || limits.most == 0) return;
+/// @return the score that matches must reach from now on
+float offer(const MatchLimits& limits, float score, const std::string& id, RawMatches& best) {
+    if (!(score > limits.threshold) || limits.most == 0) return limits.threshold;
     if (best.size() < limits.most) {
         best.emplace(score, id);
-        return;
+    } else if (const auto worst = best.begin();
+               score > worst->score || (score == worst->score && id > worst->id)) {
+        auto node = best.extract(worst); // the new one takes its place in memory
+        node.value().score = score;
+        node.value().id = id;
+        best.insert(std::move(node));
     }
-    const auto worst = best.begin();
-    if (score < worst->score || (score == worst->score && !(id > worst->id))) return;
-    // The node of the worst takes the new one.
-    auto node = best.extract(worst);
-    node.value().score = score;
-    node.value().id = id;
-    best.insert(std::move(node));
+    return best.size() < limits.most ? limits.threshold : best.begin()->score;
 }
 
 void addTo(ScoreHistogram& sum, const ScoreHistogram& part) {
@@ -45,10 +45,15 @@ RawMatches bestOf(const std::vector<const RawMatches*>& sets, unsigned int most)
 
 void searchGallery(const GalleryIterator& gallery, const std::vector<MatchLimits>& limits,
                    GalleryResults& results) {
-    while (gallery->loadNextItems() != 0)
-        for (const GalleryIterator::Item& item : gallery->compare())
-            for (std::size_t p = 0; p < limits.size(); ++p)
-                offer(limits[p], item.scores[p], item.id, results.matches[p]);
+    // Nearly all scores of a large gallery stay below what is needed: that test comes first and alone.
+    std::vector<float> needed;
+    for (const MatchLimits& l : limits) needed.push_back(l.threshold);
+    GalleryIterator::Body& walk = *gallery.operator->();
+    while (walk.loadNextItems() != 0)
+        for (const GalleryIterator::Item& item : walk.compare())
+            for (std::size_t p = 0; p < needed.size(); ++p)
+                if (item.scores[p] >= needed[p])
+                    needed[p] = offer(limits[p], item.scores[p], item.id, results.matches[p]);
     if (const auto* const distributions = gallery->rawScoreDistributions())
         results.distributions = *distributions;
 }

@@ -6,6 +6,7 @@
 #include "train/face_training.h"
 #include "train/feature_measurement.h"
 #include "train/feature_training.h"
+#include "train/l5_training.h"
 
 #include <CLI/CLI.hpp>
 
@@ -40,6 +41,7 @@ int main(int argc, char** argv) {
     training("eyes", "The file of the eyes finder", Train::trainEyesFinder);
     training("mouth", "The file of the mouth finder", Train::trainMouthFinder);
     training("bridge", "The file of the nose bridge finder", Train::trainBridgeFinder);
+    training("l5", "The transformation and the mapping files of the L5 comparison", Train::trainL5);
     command("measure-features", "Prints how well eyes, mouth and nose bridge are found on the test images",
             "--etc", "Folder of the model files", Train::measureFeatureFinders);
     std::string scores, algorithm;
