@@ -1,8 +1,12 @@
+#include "eye/cara/first_test.h"
 #include "eye/cara/sod_image.h"
-
 #include "eye/discriminator/sod_conversion.h"
+#include "eye/random_svm.h"
+#include "support/each_target.h"
 
 #include <gtest/gtest.h>
+
+#include <algorithm>
 
 #include <random>
 
@@ -54,6 +58,37 @@ TEST(SodImage, WindowsMatchConvertedTrainedVectors) {
         const auto converted =
             SodConversion::sod2csod(trained, 16, 16, SodConversion::SodLayout::ColumnAligned, halfSetFiller);
         EXPECT_EQ(window * converted, sods.trainedWindow(x, y) * trained);
+    }
+}
+
+TEST(FirstTest, AcceptsTheWindowsThatTheDiscriminatorAccepts) {
+    using namespace Eye::Cara;
+    using Eye::Implementation::TrainedSvm;
+    const auto dimension =
+        static_cast<std::uint32_t>(Eye::Implementation::SodConversion::trainedSize(16, 16));
+    // Machines of one to three vectors, of which about half of the windows pass.
+    struct {
+        std::size_t vectors;
+        const char* steps[2];
+        std::uint32_t w, h;
+    } const cases[] = {{1, {"1", "1"}, 90, 33},
+                       {2, {"1", "2"}, 60, 100},
+                       {3, {"2", "3"}, 40, 150},
+                       {2, {"1", "2"}, 17, 17},
+                       {2, {"1", "2"}, 16, 40}};
+    for (const auto& [vectors, steps, w, h] : cases) {
+        SCOPED_TRACE(std::to_string(vectors) + " vectors, " + std::to_string(w) + "x" + std::to_string(h));
+        TrainedSvm svm = randomSvm(TrainedSvm::Kernel::Dot, vectors, dimension, w);
+        svm.bias = 0;
+        const T8::SodDotDiscriminator discriminator(svm, {"", {{steps[0], -40.0f}, {steps[1], -10.0f}}});
+        const SodImage sods(noise(w, h, 30, w));
+        const std::vector<unsigned char> expected = T8::Plain::acceptedWindows(discriminator, sods);
+        EXPECT_EQ(expected.size(), std::size_t{sods.gridWidth()} * sods.gridHeight());
+        if (expected.size() > 100) {
+            EXPECT_GT(std::count(expected.begin(), expected.end(), 1), 9);
+            EXPECT_GT(std::count(expected.begin(), expected.end(), 0), 9);
+        }
+        forEachTarget([&] { EXPECT_EQ(T8::acceptedWindows(discriminator, sods), expected); });
     }
 }
 

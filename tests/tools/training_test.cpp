@@ -3,6 +3,7 @@
 #include "support/scratch_folder.h"
 #include "support/thrown.h"
 #include "train/discriminator_training.h"
+#include "train/position_tuning.h"
 #include "train/working_point.h"
 
 #include <gtest/gtest.h>
@@ -25,6 +26,11 @@ TEST(Labels, RowsCarryTheirFields) {
     EXPECT_FALSE(rows[1].position("eye_left"));
     EXPECT_FALSE(rows[1].number("age")) << "a range is no number";
     EXPECT_EQ(rows[1].splitKey(), "helen_12") << "files cut from one photo stay together";
+    EXPECT_EQ(Labelled::Row("net_7876_12_1_0.jpg", {}).splitKey(), "net_7876_12");
+    EXPECT_EQ(Labelled::Row("net_7876__-20_1006_2.jpg", {}).splitKey(), "net_7876__-20_1006");
+    EXPECT_EQ(Labelled::Row("helen_12.jpg", {}).splitKey(), "helen_12");
+    EXPECT_EQ(Labelled::Row("26_1_1_20170116161105745.jpg", {}).splitKey(), "26_1_1_20170116161105745")
+        << "an age and a gender are no photo";
 
     scratch.write("short.tsv", "file\tage\na.jpg\n");
     EXPECT_EQ(thrownBy([&] { Labelled::readLabels(scratch.file("short.tsv")); }),
@@ -43,7 +49,7 @@ TEST(Labels, SplitsHaveTheirSharesAndStay) {
     EXPECT_EQ(Labelled::splitOf("helen_100032540"), Labelled::Split::dev);
     EXPECT_EQ(Labelled::splitOf("celeba_001719"), Labelled::Split::train);
     EXPECT_EQ(Labelled::splitOf("10001"), Labelled::Split::train);
-    EXPECT_EQ(Labelled::splitOf("net_7876"), Labelled::Split::test);
+    EXPECT_EQ(Labelled::splitOf("net_7876_8"), Labelled::Split::test);
 }
 
 TEST(OperatingCurve, CountsFacesAndFalseAlarmsFromTheTop) {
@@ -92,6 +98,21 @@ std::vector<Train::Signs> facesOf(const Train::SignSet& set) {
     return faces;
 }
 
+/// The share of `windows` whose score reaches the threshold of each step.
+std::vector<double> shares(const TrainedSvm& svm, const std::vector<Train::Signs>& windows,
+                           const std::vector<Train::WorkingStep>& steps) {
+    std::vector<double> result;
+    for (const Train::WorkingStep& step : steps) {
+        TrainedSvm prefix = svm;
+        prefix.alphas.resize(step.vectors);
+        prefix.supportVectors.resize(step.vectors);
+        double kept = 0;
+        for (const Train::Signs& window : windows) kept += prefix.evaluate(window) >= step.threshold;
+        result.push_back(kept / static_cast<double>(windows.size()));
+    }
+    return result;
+}
+
 TEST(Training, MachinesTellUnseenVectorsApart) {
     const Train::SignSet train = noisyPatterns(2000, 1), test = noisyPatterns(2000, 2);
     Train::Random random(3);
@@ -113,17 +134,43 @@ TEST(Training, WorkingPointsKeepTheWantedShares) {
     TrainedSvm svm = Train::trainDot(set, 6, random);
     const std::vector<Train::WorkingStep> steps = {{1, -2.0, 0.999}, {2, -0.5, 0.99}, {6, 0.2, 0.97}};
     Train::setWorkingPoint(svm, faces, steps);
-    for (const Train::WorkingStep& step : steps) {
-        TrainedSvm prefix = svm;
-        prefix.alphas.resize(step.vectors);
-        prefix.supportVectors.resize(step.vectors);
-        double kept = 0;
-        for (const Train::Signs& face : faces) kept += prefix.evaluate(face) >= step.threshold;
-        EXPECT_GE(kept / static_cast<double>(faces.size()), step.keep - 0.002) << step.vectors;
-        if (step.vectors == 6) {
-            EXPECT_LE(kept / static_cast<double>(faces.size()), step.keep + 0.002);
-        }
-    }
+    const std::vector<double> kept = shares(svm, faces, steps);
+    for (std::size_t i = 0; i < steps.size(); ++i) EXPECT_GE(kept[i], steps[i].keep - 0.002) << i;
+    EXPECT_LE(kept.back(), steps.back().keep + 0.002);
+}
+
+TEST(Training, EarlierStepsOfAPolynomialMachineAreMetExactly) {
+    const Train::SignSet set = noisyPatterns(4000, 8);
+    Train::Random random(9);
+    TrainedSvm svm = Train::growPolynomial(set, {{4, 12, 40}, 0.1f, 500}, random);
+    const std::vector<Train::WorkingStep> steps = {{4, -0.8, 0.99}, {12, -0.5, 0.98}, {40, 0.3, 0.97}};
+    Train::setWorkingPoints(svm, facesOf(set), steps, set.vectors);
+    const std::vector<double> kept = shares(svm, facesOf(set), steps);
+    for (std::size_t i = 0; i < steps.size(); ++i) EXPECT_NEAR(kept[i], steps[i].keep, 0.003) << i;
+    EXPECT_GT(accuracy(svm, set), 0.95) << "still a discriminator";
+}
+
+TEST(PositionTuning, MovesThePlaceOfTheBestWindowsToTheLabel) {
+    // Of each search, the windows left of the place look like the pattern, those right of it only half as
+    // much.
+    const Train::SignSet set = noisyPatterns(3000, 10);
+    Train::Random random(11);
+    TrainedSvm svm = Train::growPolynomial(set, {{20}, 0.1f, 500}, random);
+    for (float& alpha : svm.alphas) alpha *= 0.1f; // so that no window decides alone
+    const std::vector<Train::Signs> faces = facesOf(set);
+    const auto error = [&](const TrainedSvm& machine) {
+        double sum = 0;
+        for (std::size_t i = 0; i + 1 < faces.size(); i += 2)
+            sum += machine.evaluate(faces[i]) > machine.evaluate(set.vectors[2 * i + 1]) ? 0 : 1;
+        return sum;
+    };
+    Train::PositionTuning tuning(svm, 0.1f);
+    for (std::size_t i = 0; i + 1 < faces.size(); i += 2)
+        tuning.add({{faces[i], {0.3f, 0}, 0}, {set.vectors[2 * i + 1], {0, 0}, 0}}, 1);
+    const TrainedSvm tuned = tuning.tuned(faces, {{20, -0.5, 0.95}});
+    EXPECT_LT(error(svm), 0.1 * static_cast<double>(faces.size()) / 2) << "the pattern wins";
+    EXPECT_GT(error(tuned), 0.8 * static_cast<double>(faces.size()) / 2) << "the windows at the place win";
+    EXPECT_NEAR(shares(tuned, faces, {{20, -0.5, 0.95}})[0], 0.95, 0.003);
 }
 
 } // namespace

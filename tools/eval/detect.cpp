@@ -4,81 +4,58 @@
 #include "fn/imagefile/image_file.h"
 
 #include <algorithm>
-#include <atomic>
 #include <cstdio>
-#include <thread>
+#include <map>
 
 #include <nlohmann/json.hpp>
 
 namespace Eval {
 namespace {
 
-struct LabelledPicture {
-    std::filesystem::path file;
-    std::vector<std::pair<FNPos, FNPos>> eyes;
-};
-
-std::vector<LabelledPicture> picturesOf(const DetectOptions& options) {
-    std::vector<LabelledPicture> pictures;
-    for (const std::string& labels : options.labels)
-        for (const Labelled::Row& row : Labelled::readLabels(labels)) {
-            if (options.split && Labelled::splitOf(row.splitKey()) != *options.split) continue;
-            if (pictures.empty() || pictures.back().file != row.image())
-                pictures.push_back({row.image(), {}});
-            const auto left = row.position("eye_left"), right = row.position("eye_right");
-            if (left && right) pictures.back().eyes.emplace_back(*left, *right);
-        }
-    return pictures;
-}
-
-bool standsFor(const FaceFinder::Location& report, const std::pair<FNPos, FNPos>& eyes) {
-    constexpr float mostOff = 0.35f, mostRatio = 1.6f;
-    const float distance = length(eyes.second - eyes.first);
-    const float ratio = report.width / distance;
-    return length(report.pos - (eyes.first + eyes.second) / 2.0f) <= mostOff * distance &&
-           ratio <= mostRatio && ratio >= 1 / mostRatio;
-}
-
-DetectedPicture judge(const FaceFinder& finder, const DetectOptions& options,
+DetectedPicture judge(const FaceFinder& finder, const EyeDistances& eyeDistances,
                       const LabelledPicture& picture) {
     DetectedPicture result;
     result.file = picture.file.string();
     std::list<FaceFinder::Location> reports;
     try {
-        finder.find(Fn::readImage(result.file), reports, options.minRelEyeDistance, options.maxRelEyeDistance,
+        finder.find(Fn::readImage(result.file), reports, eyeDistances.least, eyeDistances.most,
                     FaceFinder::everywhere);
     } catch (const std::exception& e) {
         result.failure = e.what();
         return result;
     }
-    for (const auto& eyes : picture.eyes) {
-        DetectedPicture::Face face{length(eyes.second - eyes.first), {}};
-        const auto hit =
-            std::find_if(reports.begin(), reports.end(),
-                         [&](const FaceFinder::Location& report) { return standsFor(report, eyes); });
+    for (const FaceTruth& truth : picture.faces) {
+        DetectedPicture::Face face{truth.eyeDistance(), {}, truth.group};
+        const auto hit = std::find_if(reports.begin(), reports.end(),
+                                      [&](const auto& report) { return truth.meantBy(report); });
         if (hit != reports.end()) {
             face.confidence = hit->confidence;
             reports.erase(hit);
         }
-        result.faces.push_back(face);
+        if (truth.counts) result.faces.push_back(face);
     }
     for (const FaceFinder::Location& report : reports) result.falseAlarms.push_back(report.confidence);
     return result;
 }
 
+/// How many faces there are, and how many of them were found.
+struct Share {
+    std::size_t all = 0, found = 0;
+    void add(const DetectedPicture::Face& face) {
+        ++all;
+        found += face.confidence.has_value();
+    }
+    double percent() const { return 100.0 * static_cast<double>(found) / static_cast<double>(all); }
+};
+
 } // namespace
 
-std::vector<DetectedPicture> detect(const FaceFinder& finder, const DetectOptions& options) {
-    const std::vector<LabelledPicture> pictures = picturesOf(options);
+std::vector<DetectedPicture> detect(const FaceFinder& finder, const Selection& selection,
+                                    const EyeDistances& eyeDistances) {
+    const std::vector<LabelledPicture> pictures = picturesOf(selection);
     std::vector<DetectedPicture> results(pictures.size());
-    std::atomic<std::size_t> next = 0;
-    std::vector<std::thread> threads;
-    for (unsigned job = 0; job < std::max(options.jobs, 1u); ++job)
-        threads.emplace_back([&] {
-            for (std::size_t i; (i = next++) < pictures.size();)
-                results[i] = judge(finder, options, pictures[i]);
-        });
-    for (std::thread& thread : threads) thread.join();
+    forEachOf(pictures.size(), selection.jobs,
+              [&](std::size_t i) { results[i] = judge(finder, eyeDistances, pictures[i]); });
     return results;
 }
 
@@ -133,16 +110,24 @@ void printDetection(const std::vector<DetectedPicture>& pictures, std::ostream& 
     stream << "\n  eye distance   faces   found\n";
     constexpr float bounds[] = {0, 10, 15, 20, 30, 40, 60, 80, 1e9f};
     for (std::size_t i = 0; i + 1 < std::size(bounds); ++i) {
-        std::size_t all = 0, found = 0;
+        Share share;
         for (const DetectedPicture& picture : pictures)
             for (const auto& face : picture.faces)
-                if (face.eyeDistance >= bounds[i] && face.eyeDistance < bounds[i + 1]) {
-                    ++all;
-                    found += face.confidence.has_value();
-                }
-        if (all == 0) continue;
-        std::snprintf(line, sizeof line, "  from %4.0f px  %7zu   %6.2f %%\n", bounds[i], all,
-                      100.0 * static_cast<double>(found) / static_cast<double>(all));
+                if (face.eyeDistance >= bounds[i] && face.eyeDistance < bounds[i + 1]) share.add(face);
+        if (share.all == 0) continue;
+        std::snprintf(line, sizeof line, "  from %4.0f px  %7zu   %6.2f %%\n", bounds[i], share.all,
+                      share.percent());
+        stream << line;
+    }
+
+    std::map<std::string, Share> groups;
+    for (const DetectedPicture& picture : pictures)
+        for (const auto& face : picture.faces) groups[face.group].add(face);
+    if (groups.size() < 2) return;
+    stream << "\n  group                faces   found\n";
+    for (const auto& [group, share] : groups) {
+        std::snprintf(line, sizeof line, "  %-17.40s  %7zu   %6.2f %%\n",
+                      group.empty() ? "unknown" : group.c_str(), share.all, share.percent());
         stream << line;
     }
 }
@@ -160,6 +145,7 @@ std::string detectionJson(const std::vector<DetectedPicture>& pictures) {
         for (const auto& face : picture.faces)
             entry["faces"].push_back(
                 {{"eye_distance", face.eyeDistance},
+                 {"group", face.group},
                  {"confidence", face.confidence ? nlohmann::json(*face.confidence) : nullptr}});
         if (!picture.failure.empty()) entry["failure"] = picture.failure;
         json["pictures"].push_back(entry);

@@ -1,7 +1,6 @@
 #pragma once
 
-#include "eye/face_finder.h"
-#include "labelled/labels.h"
+#include "eval/pictures.h"
 
 #include <optional>
 #include <ostream>
@@ -12,12 +11,9 @@
 
 namespace Eval {
 
-struct DetectOptions {
-    std::vector<std::string> labels;      ///< files in the format of labels.tsv
-    std::optional<Labelled::Split> split; ///< only this part, all of it if not set
-    double minRelEyeDistance = 0.02;      ///< in widths of the image
-    double maxRelEyeDistance = 0.5;
-    unsigned jobs = 1;
+/// Eye distances to look for, in widths of the image.
+struct EyeDistances {
+    double least = 0.02, most = 0.5;
 };
 
 /// What one picture gave.
@@ -25,16 +21,17 @@ struct DetectedPicture {
     struct Face {
         float eyeDistance;               ///< image pixels
         std::optional<float> confidence; ///< of what was found there
+        std::string group = {};          ///< its value in the column that figures are divided by
     };
     std::string file;
-    std::vector<Face> faces;
+    std::vector<Face> faces;        ///< that count
     std::vector<float> falseAlarms; ///< their confidences
     std::string failure;            ///< why the picture could not be read
 };
 
-/// Runs the finder over all pictures. A report stands for a labelled face if its midpoint of the eyes lies
-/// within 0.35 eye distances of the label's, and the eye distances differ by no more than a factor of 1.6.
-std::vector<DetectedPicture> detect(const FaceFinder& finder, const DetectOptions& options);
+/// Runs the finder over all pictures.
+std::vector<DetectedPicture> detect(const FaceFinder& finder, const Selection& selection,
+                                    const EyeDistances& eyeDistances);
 
 /// One line of the table: what holds for reports of at least this confidence.
 struct OperatingPoint {

@@ -1,7 +1,11 @@
-// orbek-eval: accuracy reports over labelled images. Exit status 0, 1 for a failure, 2 if a picture could not be read.
+// orbek-eval: accuracy reports over labelled images. Exit status 0, 1 for a failure, 2 if a picture could not
+// be read.
 
 #include "eval/detect.h"
 #include "eval/finder_access.h"
+#include "eval/landmarks.h"
+#include "eval/plot.h"
+#include "eval/yardsticks.h"
 #include "fn/exception.h"
 
 #include <CLI/CLI.hpp>
@@ -11,9 +15,98 @@
 
 namespace {
 
+/// What all reports take.
+struct Options {
+    Eval::Selection selection;
+    Eval::EyeDistances eyeDistances;
+    std::string etc, finder = "orbek", settings = "Strict", json, plot;
+};
+
 void writeFile(const std::string& name, const std::string& content) {
     std::ofstream file(name);
     if (!(file << content)) FN_THROW(FNEIOError, "Cannot write " + name);
+}
+
+int statusOf(const std::vector<std::string>& failures) {
+    for (const std::string& failure : failures) std::cerr << "orbek-eval: " << failure << "\n";
+    return failures.empty() ? 0 : 2;
+}
+
+int detect(const Options& options) {
+    const std::optional<FaceFinder> yardstick = Eval::makeYardstick(options.finder);
+    const FaceFinder finder = yardstick ? *yardstick : Eval::makeFaceFinder(options.etc);
+    const auto pictures = Eval::detect(finder, options.selection, options.eyeDistances);
+    Eval::printDetection(pictures, std::cout);
+    if (!options.json.empty()) writeFile(options.json, Eval::detectionJson(pictures));
+    if (!options.plot.empty()) {
+        Eval::Curve curve{options.finder, {}};
+        for (const Eval::OperatingPoint& point : Eval::operatingCurve(pictures))
+            curve.points.emplace_back(point.falseAlarmsPerImage, point.recall);
+        writeFile(options.plot, Eval::plotSvg("Faces found", {"false alarms per picture", 0.001, 10, true},
+                                              {"share of faces", 0, 1}, {curve}));
+    }
+    std::vector<std::string> failures;
+    for (const Eval::DetectedPicture& picture : pictures)
+        if (!picture.failure.empty()) failures.push_back(picture.file + ": " + picture.failure);
+    return statusOf(failures);
+}
+
+int eyes(const Options& options) {
+    const Eval::LandmarkFinders finders{
+        Eval::makeFaceFinder(options.etc), Eval::makeEyesFinder(options.etc, options.settings),
+        Eval::makeMouthFinder(options.etc), Eval::makeBridgeFinder(options.etc)};
+    const Eval::LandmarkReport report =
+        Eval::measureLandmarks(finders, options.selection, options.eyeDistances);
+    Eval::printLandmarks(report, std::cout);
+    if (!options.json.empty()) writeFile(options.json, Eval::landmarksJson(report));
+    if (!options.plot.empty()) {
+        std::vector<Eval::Curve> curves;
+        for (const Eval::LandmarkErrors* const errors : {&report.eyes, &report.mouth, &report.bridge}) {
+            Eval::Curve curve{errors->name, {}};
+            constexpr float most = 0.25f, step = 0.0025f;
+            for (float limit = 0; limit <= most; limit += step)
+                curve.points.emplace_back(limit, errors->within(limit));
+            curves.push_back(curve);
+        }
+        writeFile(options.plot, Eval::plotSvg("Landmarks", {"error, eye distances", 0, 0.25},
+                                              {"share of those found", 0, 1}, curves));
+    }
+    return statusOf(report.failures);
+}
+
+CLI::App* report(CLI::App& app, const char* name, const char* doc, Options& options) {
+    CLI::App* const command = app.add_subcommand(name, doc);
+    Eval::Selection& selection = options.selection;
+    command->add_option("--labels", selection.labels, "Label files; image paths are relative to them")
+        ->required()
+        ->check(CLI::ExistingFile);
+    command->add_option("--split", selection.split, "Only this part of the data")
+        ->transform(
+            CLI::CheckedTransformer(std::map<std::string, Labelled::Split>{{"train", Labelled::Split::train},
+                                                                           {"dev", Labelled::Split::dev},
+                                                                           {"test", Labelled::Split::test}}));
+    command->add_flag("--by-hand", selection.onlyByHand, "Only faces count whose eyes were labelled by hand");
+    command->add_option("--from-pixels", selection.leastEyeDistance,
+                        "Only faces count whose eyes are so far apart");
+    command->add_option("--to-pixels", selection.mostEyeDistance,
+                        "Only faces count whose eyes are no farther apart");
+    command->add_option("--max-rotation", selection.mostRotation,
+                        "Only faces count that are turned no more in the image plane, degrees");
+    command->add_option("--by", selection.groupColumn, "Column of the labels to divide figures by");
+    command->add_option("--jobs", selection.jobs, "Pictures at a time")->capture_default_str();
+    command->add_option("--etc", options.etc, "Folder with the trained content")
+        ->required()
+        ->check(CLI::ExistingDirectory);
+    command
+        ->add_option("--min-eye", options.eyeDistances.least,
+                     "Smallest eye distance to look for, in widths of the image")
+        ->capture_default_str();
+    command
+        ->add_option("--max-eye", options.eyeDistances.most, "Largest eye distance, in widths of the image")
+        ->capture_default_str();
+    command->add_option("--json", options.json, "File that gets every figure");
+    command->add_option("--plot", options.plot, "SVG file that gets the curve");
+    return command;
 }
 
 } // namespace
@@ -21,39 +114,21 @@ void writeFile(const std::string& name, const std::string& content) {
 int main(int argc, char** argv) {
     CLI::App app("Accuracy reports over labelled images (labels.tsv).");
     app.require_subcommand(1);
-    std::string etc, json;
-    Eval::DetectOptions options;
-    CLI::App* const detect = app.add_subcommand("detect", "Faces found, and false alarms");
-    detect->add_option("--labels", options.labels, "Label files; image paths are relative to them")
-        ->required()
-        ->check(CLI::ExistingFile);
-    detect->add_option("--etc", etc, "Folder with the trained content")
-        ->required()
-        ->check(CLI::ExistingDirectory);
-    detect->add_option("--split", options.split, "Only this part of the data")
-        ->transform(
-            CLI::CheckedTransformer(std::map<std::string, Labelled::Split>{{"train", Labelled::Split::train},
-                                                                           {"dev", Labelled::Split::dev},
-                                                                           {"test", Labelled::Split::test}}));
-    detect
-        ->add_option("--min-eye", options.minRelEyeDistance, "Smallest eye distance, in widths of the image")
+    Options options;
+    CLI::App* const detectCommand = report(app, "detect", "Faces found, and false alarms", options);
+    std::vector<std::string> finders = Eval::yardstickNames();
+    finders.push_back("orbek");
+    detectCommand->add_option("--finder", options.finder, "This library's finder, or one to compare with")
+        ->check(CLI::IsMember(finders))
         ->capture_default_str();
-    detect->add_option("--max-eye", options.maxRelEyeDistance, "Largest eye distance, in widths of the image")
+    CLI::App* const eyesCommand =
+        report(app, "eyes", "How exactly eyes, mouth and nose bridge are found", options);
+    eyesCommand->add_option("--settings", options.settings, "Thresholds of the eyes finder")
+        ->check(CLI::IsMember({"Strict", "Tolerant"}))
         ->capture_default_str();
-    detect->add_option("--jobs", options.jobs, "Pictures at a time")->capture_default_str();
-    detect->add_option("--json", json, "File that gets every figure");
     CLI11_PARSE(app, argc, argv);
     try {
-        const auto pictures = Eval::detect(Eval::makeFaceFinder(etc), options);
-        Eval::printDetection(pictures, std::cout);
-        if (!json.empty()) writeFile(json, Eval::detectionJson(pictures));
-        int status = 0;
-        for (const Eval::DetectedPicture& picture : pictures)
-            if (!picture.failure.empty()) {
-                std::cerr << "orbek-eval: " << picture.file << ": " << picture.failure << "\n";
-                status = 2;
-            }
-        return status;
+        return *detectCommand ? detect(options) : eyes(options);
     } catch (const std::exception& e) {
         std::cerr << "orbek-eval: " << e.what() << "\n";
         return 1;

@@ -5,6 +5,7 @@
 #include <charconv>
 #include <cstdint>
 #include <fstream>
+#include <string_view>
 
 namespace Labelled {
 namespace {
@@ -42,10 +43,20 @@ std::optional<FNPos> Row::position(const std::string& name) const {
 std::string Row::splitKey() const {
     const std::string person = text("person");
     if (!person.empty()) return person;
-    // Several files can be cut from one photo: same number, different suffix.
+    // In these sets several files can be cut from one photo, which the first parts of the name tell.
+    struct CutSet {
+        std::string_view prefix;
+        int partsOfPhoto;
+    };
+    constexpr CutSet cutSets[] = {{"helen_", 1}, {"net_7876__", 2}, {"net_7876_", 1}};
     const std::string stem = image_.stem().string();
-    const std::size_t second = stem.find('_', stem.find('_') + 1);
-    return stem.substr(0, second);
+    for (const auto& [prefix, parts] : cutSets) {
+        if (!stem.starts_with(prefix)) continue;
+        std::size_t end = prefix.size() - 1;
+        for (int i = 0; i < parts && end != std::string::npos; ++i) end = stem.find('_', end + 1);
+        return stem.substr(0, end);
+    }
+    return stem;
 }
 
 std::vector<Row> readLabels(const std::filesystem::path& tsv) {

@@ -6,6 +6,7 @@
 
 #include <algorithm>
 #include <cmath>
+#include <limits>
 
 namespace Train {
 namespace {
@@ -15,6 +16,14 @@ constexpr float leastEyeDistance = 14;
 
 constexpr const char* faceFolders[] = {"people/lfw",        "people/celeba",  "portraits/fairface",
                                        "portraits/utkface", "portraits/mtfl", "scenes/faces"};
+
+FNImage<unsigned short> mirrored(const FNImage<unsigned short>& image) {
+    FNImage<unsigned short> result(image.w(), image.h());
+    unsigned short* out = result.getExclusive();
+    for (std::uint32_t y = 0; y < image.h(); ++y, out += image.w())
+        std::reverse_copy(image.row(y), image.row(y) + image.w(), out);
+    return result;
+}
 
 bool nearProfile(const Labelled::Row& row) {
     return std::abs(row.number("pose").value_or(0)) > 1;
@@ -52,6 +61,34 @@ std::vector<FNImage<unsigned short>> loadBackgrounds(const std::filesystem::path
         if (Labelled::splitOf(row.image().stem().string()) == split)
             images.push_back(Fn::readImage(row.image().string()).toMono16());
     return images;
+}
+
+std::vector<Scenery> loadSceneries(const std::filesystem::path& data, Labelled::Split split,
+                                   std::size_t mostSurroundings, Random& random) {
+    std::vector<Scenery> sceneries;
+    for (const FNImage<unsigned short>& image : loadBackgrounds(data, split)) {
+        sceneries.push_back({image, {}});
+        sceneries.push_back({mirrored(image), {}});
+    }
+    constexpr std::size_t all = std::numeric_limits<std::size_t>::max();
+    for (const Labelled::Row& row : faceRows(data, split, all, random)) {
+        if (mostSurroundings == 0) break;
+        if (row.text("person").empty()) continue; // other people may be in it
+        --mostSurroundings;
+        sceneries.push_back({Fn::readImage(row.image().string()).toMono16(),
+                             {{*row.position("eye_left"), *row.position("eye_right")}}});
+    }
+    return sceneries;
+}
+
+bool Scenery::showsFace(FNPos centre, float eyeDistance) const {
+    constexpr float mostOff = 0.6f, mostRatio = 1.8f;
+    if (!eyes) return false;
+    const FNPos across = eyes->second - eyes->first;
+    const float distance = length(across), ratio = eyeDistance / distance;
+    const FNPos middle =
+        (eyes->first + eyes->second) / 2.0f + FNPos{-across.y, across.x} * Eye::Cara::T8::eyeLineToCentre;
+    return length(centre - middle) < mostOff * distance && ratio < mostRatio && ratio > 1 / mostRatio;
 }
 
 FNImage<unsigned short> facePatch(const FacePicture& face, std::uint32_t pixels, float eyeDistance,

@@ -5,6 +5,8 @@
 #include "train/sign_matrix.h"
 
 #include <filesystem>
+#include <optional>
+#include <utility>
 #include <vector>
 
 namespace Train {
@@ -20,11 +22,26 @@ struct FacePicture {
 std::vector<Labelled::Row> faceRows(const std::filesystem::path& data, Labelled::Split split,
                                     std::size_t most, Random& random);
 
-/// All faces of one split in the face folders below `data`, and the pictures without a face.
+/// All faces of one split in the face folders below `data`.
 std::vector<FacePicture> loadFaces(const std::filesystem::path& data, Labelled::Split split, std::size_t most,
                                    Random& random);
+
+/// A picture to learn from what is no face.
+struct Scenery {
+    FNImage<unsigned short> image;
+    std::optional<std::pair<FNPos, FNPos>> eyes; ///< of the one face in it, if there is one
+
+    /// Whether a window around `centre` made for this eye distance shows that face, even badly.
+    bool showsFace(FNPos centre, float eyeDistance) const;
+};
+
+/// Pictures without a face.
 std::vector<FNImage<unsigned short>> loadBackgrounds(const std::filesystem::path& data,
                                                      Labelled::Split split);
+/// Pictures without a face and their mirror images, and pictures cut around a single face.
+/// @param mostSurroundings so many of the latter at most
+std::vector<Scenery> loadSceneries(const std::filesystem::path& data, Labelled::Split split,
+                                   std::size_t mostSurroundings, Random& random);
 
 /// How a training patch deviates from the labelled face.
 struct Jitter {

@@ -15,6 +15,7 @@
 #include <cstdio>
 #include <functional>
 #include <memory>
+#include <optional>
 
 namespace Train {
 namespace {
@@ -82,14 +83,6 @@ template <class Visit> void forEachLevel(const Image& image, Visit visit) {
     }
 }
 
-Image mirrored(const Image& image) {
-    Image result(image.w(), image.h());
-    unsigned short* out = result.getExclusive();
-    for (std::uint32_t y = 0; y < image.h(); ++y, out += image.w())
-        std::reverse_copy(image.row(y), image.row(y) + image.w(), out);
-    return result;
-}
-
 /// Collects a random sample of bounded size (reservoir sampling, Vitter 1985).
 class Reservoir {
 public:
@@ -112,20 +105,48 @@ private:
     std::vector<Signs> vectors_;
 };
 
+/// A place where a window of the scan lies on a picture without a face, or away from its face.
+struct Place {
+    const Scenery& scenery;
+    const ScannedLevel& level;
+    std::uint32_t x, y; ///< of the window in the level's grid
+
+    FNGridPos gridPos() const { return {static_cast<std::int32_t>(x), static_cast<std::int32_t>(y)}; }
+    FNPos centre() const {
+        return level.bordered.mapping(
+            {static_cast<float>(x) + T8::windowCentre, static_cast<float>(y) + T8::windowCentre});
+    }
+};
+
+/// How much more than in use the last stage lets through where the final test learns.
+constexpr double relaxed = 0.35;
+
+std::vector<WorkingStep> relaxedSteps(std::vector<WorkingStep> steps) {
+    for (WorkingStep& step : steps) step.threshold -= relaxed;
+    return steps;
+}
+
+/// What a window passes on its way to the final test, for one rotation.
+struct TrainedRotation {
+    float angle;
+    T8::SodDotDiscriminator disc1B;
+    T8::SodPolynomialDiscriminator disc1C;
+    T8::GaborDiscriminator disc2A;
+};
+
 class FaceTraining {
 public:
     FaceTraining(const std::filesystem::path& data, const std::filesystem::path& out, std::uint64_t seed)
         : data_(data), out_(out), random_(seed) {}
 
     void run() {
-        constexpr std::size_t mostFaces = 12000, mostDevFaces = 3000;
+        constexpr std::size_t mostFaces = 14000, mostDevFaces = 3000, mostSurroundings = 2500;
         faces_ = loadFaces(data_, Labelled::Split::train, mostFaces, random_);
         devFaces_ = loadFaces(data_, Labelled::Split::dev, mostDevFaces, random_);
-        backgrounds_ = loadBackgrounds(data_, Labelled::Split::train);
-        for (std::size_t i = 0, n = backgrounds_.size(); i < n; ++i)
-            backgrounds_.push_back(mirrored(backgrounds_[i]));
-        std::printf("%zu faces to learn from, %zu to set working points, %zu pictures without faces\n",
-                    faces_.size(), devFaces_.size(), backgrounds_.size());
+        sceneries_ = loadSceneries(data_, Labelled::Split::train, mostSurroundings, random_);
+        std::printf(
+            "%zu faces to learn from, %zu to set working points, %zu pictures to learn what is none\n",
+            faces_.size(), devFaces_.size(), sceneries_.size());
         trainFirst();
         for (const Rotation& rotation : rotations) trainRotation(rotation);
         trainFinal();
@@ -143,25 +164,36 @@ private:
         return vectors;
     }
 
-    /// Windows of the pictures without faces that pass `accept`, in trained order.
-    std::vector<Signs> mineSods(std::size_t most, std::size_t skip, const Accept& accept) {
-        Reservoir reservoir(most, random_);
+    /// Visits the windows without a face that `accept` lets through, of all pictures.
+    /// @param skip look at one window of so many
+    template <class Visit> void forEachBackground(std::size_t skip, const Accept& accept, Visit visit) {
         Signs window(SodImage::windowBits);
         unsigned char* const bytes = window.exclusiveBytes();
-        std::size_t visited = 0;
-        for (const Image& image : backgrounds_)
-            forEachLevel(image, [&](const ScannedLevel& level) {
+        std::size_t visited = 0, passed = 0;
+        for (const Scenery& scenery : sceneries_)
+            forEachLevel(scenery.image, [&](const ScannedLevel& level) {
                 for (std::uint32_t y = 0; y < level.sods.gridHeight(); ++y)
                     for (std::uint32_t x = 0; x < level.sods.gridWidth(); ++x) {
                         if (skip > 1 && random_() % skip != 0) continue;
-                        ++visited;
+                        const Place place{scenery, level, x, y};
                         level.sods.getWindow(x, y, bytes);
-                        if (accept(window)) reservoir.offer([&] { return level.sods.trainedWindow(x, y); });
+                        ++visited;
+                        if (!accept(window) || scenery.showsFace(place.centre(), level.eyeDistance)) continue;
+                        ++passed;
+                        visit(place);
                     }
             });
-        std::printf("  %zu of %zu background windows pass (%.4f %%), %zu are kept\n", reservoir.seen(),
-                    visited, 100.0 * static_cast<double>(reservoir.seen()) / static_cast<double>(visited),
-                    reservoir.vectors().size());
+        std::printf("  %zu of %zu background windows pass (%.4f %%)\n", passed, visited,
+                    100.0 * static_cast<double>(passed) / static_cast<double>(visited));
+        std::fflush(stdout);
+    }
+
+    /// Windows that pass `accept`, in trained order.
+    std::vector<Signs> mineSods(std::size_t most, std::size_t skip, const Accept& accept) {
+        Reservoir reservoir(most, random_);
+        forEachBackground(skip, accept, [&](const Place& place) {
+            reservoir.offer([&] { return place.level.sods.trainedWindow(place.x, place.y); });
+        });
         return reservoir.vectors();
     }
 
@@ -211,34 +243,33 @@ private:
                                          {{200}, 0.1f}, random_);
         setWorkingPoint(svm2, gaborSigns(devFaces_, jitter, 2), rotation.disc2A);
         save(svm2, out_ / ("gs1717f" + name + ".dat"));
-        collectCandidates(rotation, passesAll,
-                          T8::GaborDiscriminator(svm2, settingsOf("2A", rotation.disc2A)));
+        rotations_.push_back({rotation.angle, discB, discC,
+                              T8::GaborDiscriminator(svm2, settingsOf("2A", relaxedSteps(rotation.disc2A)))});
     }
 
-    /// Keeps what passes all stages of a rotation on background, as the final test will see it.
-    void collectCandidates(const Rotation& rotation, const Accept& accept,
-                           const T8::GaborDiscriminator& last) {
+    /// What passes the stages of a rotation on background, the last one nearly, as the final test sees it.
+    /// @param most so many at random
+    std::vector<Signs> mineFinal(std::size_t most) {
         const WindowConvolver convolver;
+        Reservoir reservoir(most, random_);
         Signs window(SodImage::windowBits);
-        unsigned char* const bytes = window.exclusiveBytes();
-        std::size_t before = candidates_.seen();
         float score;
-        for (const Image& image : backgrounds_)
-            forEachLevel(image, [&](const ScannedLevel& level) {
-                for (std::uint32_t y = 0; y < level.sods.gridHeight(); ++y)
-                    for (std::uint32_t x = 0; x < level.sods.gridWidth(); ++x) {
-                        level.sods.getWindow(x, y, bytes);
-                        const FNGridPos at{static_cast<std::int32_t>(x), static_cast<std::int32_t>(y)};
-                        if (!accept(window) || !last(convolver.getGaborSODs(level.bordered.image, at), score))
-                            continue;
-                        const FNPos centre =
-                            level.bordered.mapping({static_cast<float>(x) + T8::windowCentre,
-                                                    static_cast<float>(y) + T8::windowCentre});
-                        candidates_.offer(
-                            [&] { return finalSigns(image, centre, level.eyeDistance, rotation.angle); });
-                    }
-            });
-        std::printf("  %zu background windows reach the final test\n", candidates_.seen() - before);
+        const Accept passesA = [&](const Signs& sods) { return (*first_)(sods, score); };
+        forEachBackground(1, passesA, [&](const Place& place) {
+            place.level.sods.getWindow(place.x, place.y, window.exclusiveBytes());
+            std::optional<Signs> gabor;
+            for (const TrainedRotation& rotation : rotations_) {
+                if (!rotation.disc1B(window, score) || !rotation.disc1C(window, score)) continue;
+                if (!gabor) gabor = convolver.getGaborSODs(place.level.bordered.image, place.gridPos());
+                if (rotation.disc2A(*gabor, score))
+                    reservoir.offer([&] {
+                        return finalSigns(place.scenery.image, place.centre(), place.level.eyeDistance,
+                                          rotation.angle);
+                    });
+            }
+        });
+        std::printf("  %zu background windows come to the final test\n", reservoir.seen());
+        return reservoir.vectors();
     }
 
     Signs finalSigns(const Image& image, FNPos centre, float eyeDistance, float angle) const {
@@ -252,7 +283,9 @@ private:
     TrainedSvm trainC(const Rotation& rotation, const std::vector<Signs>& faces,
                       const std::vector<Signs>& devFaces, const std::vector<Signs>& others) {
         TrainedSvm svm = growPolynomial(join(faces, others), {{15, 40, 300}, 0.1f}, random_);
-        setWorkingPoint(svm, devFaces, rotation.disc1C);
+        std::vector<Signs> windows = faces;
+        windows.insert(windows.end(), others.begin(), others.end());
+        setWorkingPoints(svm, devFaces, rotation.disc1C, windows);
         return svm;
     }
 
@@ -269,23 +302,10 @@ private:
     std::vector<Signs> mineGabor(std::size_t most, const Accept& accept) {
         const WindowConvolver convolver;
         Reservoir reservoir(most, random_);
-        Signs window(SodImage::windowBits);
-        unsigned char* const bytes = window.exclusiveBytes();
-        for (const Image& image : backgrounds_)
-            forEachLevel(image, [&](const ScannedLevel& level) {
-                for (std::uint32_t y = 0; y < level.sods.gridHeight(); ++y)
-                    for (std::uint32_t x = 0; x < level.sods.gridWidth(); ++x) {
-                        level.sods.getWindow(x, y, bytes);
-                        if (!accept(window)) continue;
-                        reservoir.offer([&] {
-                            return convolver.getGaborSODs(
-                                level.bordered.image,
-                                {static_cast<std::int32_t>(x), static_cast<std::int32_t>(y)});
-                        });
-                    }
-            });
-        std::printf("  %zu background windows reach the Gabor stage, %zu are kept\n", reservoir.seen(),
-                    reservoir.vectors().size());
+        forEachBackground(1, accept, [&](const Place& place) {
+            reservoir.offer(
+                [&] { return convolver.getGaborSODs(place.level.bordered.image, place.gridPos()); });
+        });
         return reservoir.vectors();
     }
 
@@ -301,8 +321,9 @@ private:
     }
 
     void trainFinal() {
-        const std::vector<Signs> faces = finalFaces(faces_, 1), devFaces = finalFaces(devFaces_, 2);
-        TrainedSvm svm = growPolynomial(join(faces, candidates_.vectors()), {{200}, 0.1f}, random_);
+        constexpr std::size_t mostOthers = 80000;
+        const std::vector<Signs> faces = finalFaces(faces_, 2), devFaces = finalFaces(devFaces_, 2);
+        TrainedSvm svm = growPolynomial(join(faces, mineFinal(mostOthers)), {{200}, 0.1f}, random_);
         setWorkingPoint(svm, devFaces, disc3ASteps);
         save(svm, out_ / "gs2323fc.dat");
     }
@@ -310,9 +331,9 @@ private:
     std::filesystem::path data_, out_;
     Random random_;
     FinalConvolver finalConvolver_;
-    Reservoir candidates_{20000, random_};
+    std::vector<TrainedRotation> rotations_;
     std::vector<FacePicture> faces_, devFaces_;
-    std::vector<Image> backgrounds_;
+    std::vector<Scenery> sceneries_;
     std::unique_ptr<T8::SodDotDiscriminator> first_;
 };
 

@@ -5,6 +5,7 @@
 #include "eye/raiz/bridge_scan.h"
 #include "train/discriminator_training.h"
 #include "train/feature_samples.h"
+#include "train/position_tuning.h"
 #include "train/working_point.h"
 
 #include <algorithm>
@@ -20,15 +21,23 @@ namespace {
 using namespace Eye::Ojo::T8;
 using Eye::Implementation::TrainedSvm;
 
-/// Distances from the labelled place, in pixels of the level: nearer windows are the feature, farther ones
-/// are not, and those between are not learned.
-constexpr float nearEnough = 0.75f, farEnough = 2.0f;
-/// What lies farther than this is another thing, not the feature's own surroundings.
-constexpr float elsewhere = 4.0f;
+/// How a feature is learned.
+struct FeatureSettings {
+    std::vector<WorkingStep> steps; ///< the thresholds are those of the finder's default settings
+    /// Distances from the labelled place, in pixels of the level: nearer windows are the feature, farther
+    /// ones are not, and those between are not learned. They follow how exactly the place is defined.
+    float nearEnough, farEnough;
+    /// What lies farther than this is another thing, not the feature's own surroundings.
+    float elsewhere;
+    float errorScale; ///< of the tuning, eye distances
+};
 
 /// The median score of the feature above the threshold. The place that is found is a mean of windows weighted
 /// with the exponential of their scores: with a greater spread, the best one alone would decide.
 constexpr double mostSpread = 0.5;
+
+/// How much more a label by hand counts than one of the automatic annotator.
+constexpr float handWeight = 3;
 
 /// An area to search, and what is there.
 struct Target {
@@ -88,11 +97,11 @@ private:
 
 template <class Scan> class FeatureTraining {
 public:
-    FeatureTraining(const Targets& targets, const std::vector<WorkingStep>& steps, std::uint64_t seed)
-        : targets_(targets), steps_(steps), random_(seed) {}
+    FeatureTraining(const Targets& targets, const FeatureSettings& settings, std::uint64_t seed)
+        : targets_(targets), settings_(settings), random_(seed) {}
 
     TrainedSvm run(const std::filesystem::path& data) {
-        constexpr std::size_t mostFaces = 8000, mostDevFaces = 2000;
+        constexpr std::size_t mostFaces = 14000, mostDevFaces = 2500;
         constexpr double smallShare = 0.3;
         constexpr std::size_t vectorsOfRounds[] = {60, 120};
         faces_ = loadLabelledFaces(data, Labelled::Split::train, mostFaces, smallShare, random_);
@@ -100,14 +109,29 @@ public:
         collect(2, [&](const Signs&) { return static_cast<float>(random_() >> 40); });
         for (const std::size_t vectors : vectorsOfRounds) {
             const Discriminator discriminator(grown(vectors), {"round", {}});
-            const float threshold = static_cast<float>(steps_.back().threshold) - 0.5f;
+            const float threshold = static_cast<float>(settings_.steps.back().threshold) - 0.5f;
             collect(2, [&](const Signs& window) {
                 float score;
                 discriminator(window, score);
                 return score > threshold ? score : Hardest::ignored;
             });
         }
-        return grown(steps_.back().vectors);
+        return tuned(grown(settings_.steps.back().vectors));
+    }
+
+    TrainedSvm tuned(const TrainedSvm& machine) {
+        PositionTuning tuning(machine, settings_.errorScale);
+        for (const LabelledFace& face : faces_)
+            for (const Target& target : targets_(face, random_)) {
+                std::vector<SearchedWindow> windows;
+                forEachWindow<Scan>(
+                    face.image, target.area, [&](const Signs& signs, FNPos centre, float size) {
+                        windows.push_back({trainedOrder_(signs), (centre - target.truth) / target.eyeDistance,
+                                           2 * std::log(size)});
+                    });
+                tuning.add(std::move(windows), face.byHand ? handWeight : 1.0f);
+            }
+        return tuning.tuned(bestWindows(machine), settings_.steps);
     }
 
 private:
@@ -117,7 +141,7 @@ private:
 
     TrainedSvm grown(std::size_t vectors) {
         GrowthSettings settings;
-        std::vector<WorkingStep> steps = steps_;
+        std::vector<WorkingStep> steps = settings_.steps;
         steps.back().vectors = vectors;
         for (const WorkingStep& step : steps) settings.groups.push_back(step.vectors);
         TrainedSvm svm = growPolynomial(set_, settings, random_);
@@ -129,7 +153,7 @@ private:
 
     /// Brings scores closer to the last threshold, if need be; what passes there stays the same.
     void limitSpread(TrainedSvm& svm, const std::vector<Signs>& dev) const {
-        const double threshold = steps_.back().threshold;
+        const double threshold = settings_.steps.back().threshold;
         std::vector<double> scores;
         for (const Signs& window : dev) scores.push_back(svm.evaluate(window));
         const auto middle = scores.begin() + static_cast<std::ptrdiff_t>(scores.size() / 2);
@@ -169,10 +193,11 @@ private:
             for (const Target& target : targets_(face, random_)) {
                 Hardest around(most), others(most);
                 forEachWindowOf(face, target, [&](const Window& window) {
-                    if (window.rightScale && window.distance < nearEnough)
+                    if (window.rightScale && window.distance < settings_.nearEnough)
                         set_.add(trainedOrder_(window.signs), true);
-                    else if (window.distance > farEnough)
-                        (window.distance < elsewhere ? around : others).offer(window, rank(window.signs));
+                    else if (window.distance > settings_.farEnough)
+                        (window.distance < settings_.elsewhere ? around : others)
+                            .offer(window, rank(window.signs));
                 });
                 for (const Hardest* const hardest : {&around, &others})
                     for (const auto& [r, window] : hardest->windows())
@@ -191,7 +216,7 @@ private:
                 Signs best;
                 double bestScore = -std::numeric_limits<double>::infinity();
                 forEachWindowOf(face, target, [&](const Window& window) {
-                    if (!window.rightScale || window.distance > farEnough) return;
+                    if (!window.rightScale || window.distance > settings_.farEnough) return;
                     const Signs trained = trainedOrder_(window.signs);
                     if (const double score = svm.evaluate(trained); score > bestScore) {
                         best = trained;
@@ -204,7 +229,7 @@ private:
     }
 
     Targets targets_;
-    std::vector<WorkingStep> steps_;
+    FeatureSettings settings_;
     Random random_;
     TrainedOrder<Layout> trainedOrder_{static_cast<std::uint32_t>(
         Eye::Implementation::GSodConversion::trainedSize(Scan::columns, Scan::rows, 6))};
@@ -230,18 +255,17 @@ std::vector<Target> placedTarget(const LabelledFace& face, const std::optional<F
 
 template <class Scan>
 void train(const std::filesystem::path& data, const std::filesystem::path& out, const char* file,
-           const Targets& targets, const std::vector<WorkingStep>& steps, std::uint64_t seed) {
+           const Targets& targets, const FeatureSettings& settings, std::uint64_t seed) {
     std::filesystem::create_directories(out);
-    save(FeatureTraining<Scan>(targets, steps, seed).run(data), out / file);
+    save(FeatureTraining<Scan>(targets, settings, seed).run(data), out / file);
 }
 
 } // namespace
 
-// The thresholds are those of the finders' default settings.
-
 void trainEyesFinder(const std::filesystem::path& data, const std::filesystem::path& out,
                      std::uint64_t seed) {
-    train<EyeScan>(data, out, "eyedisc.dat", eyeTargets, {{5, -1.27, 0.995}, {300, -0.34, 0.98}}, seed);
+    train<EyeScan>(data, out, "eyedisc.dat", eyeTargets,
+                   {{{5, -1.27, 0.995}, {300, -0.34, 0.985}}, 0.75f, 2.0f, 4.0f, 0.05f}, seed);
 }
 
 void trainMouthFinder(const std::filesystem::path& data, const std::filesystem::path& out,
@@ -250,7 +274,7 @@ void trainMouthFinder(const std::filesystem::path& data, const std::filesystem::
     const auto targets = [](const LabelledFace& face, Random& random) {
         return placedTarget(face, face.mouth, Scan::placement, random);
     };
-    train<Scan>(data, out, "mouthdisc.dat", targets, {{300, -1.3, 0.985}}, seed);
+    train<Scan>(data, out, "mouthdisc.dat", targets, {{{300, -1.3, 0.99}}, 1.25f, 3.5f, 6.0f, 0.10f}, seed);
 }
 
 void trainBridgeFinder(const std::filesystem::path& data, const std::filesystem::path& out,
@@ -259,7 +283,8 @@ void trainBridgeFinder(const std::filesystem::path& data, const std::filesystem:
     const auto targets = [](const LabelledFace& face, Random& random) {
         return placedTarget(face, face.bridge, Scan::placement, random);
     };
-    train<Scan>(data, out, "bridgedisc.dat", targets, {{300, -0.87, 0.985}}, seed);
+    train<Scan>(data, out, "bridgedisc.dat", targets, {{{300, -0.87, 0.985}}, 0.75f, 2.0f, 4.0f, 0.05f},
+                seed);
 }
 
 } // namespace Train

@@ -1,6 +1,7 @@
 #include "train/logistic.h"
 
 #include "fn/numeric/blas.h"
+#include "fn/numeric/lapack.h"
 
 #include <algorithm>
 #include <cmath>
@@ -13,27 +14,6 @@ using Blas = Fn::Numeric::Blas<float>;
 
 float sigmoid(float f) {
     return 1.0f / (1.0f + std::exp(-f));
-}
-
-/// Solves a * x = b for a symmetric positive definite `a` of m by m, by Cholesky decomposition in place.
-void solveSymmetric(std::vector<double>& a, std::vector<double>& b) {
-    const std::size_t m = b.size();
-    for (std::size_t j = 0; j < m; ++j) {
-        for (std::size_t k = 0; k < j; ++k) {
-            const double l = a[j + k * m];
-            for (std::size_t i = j; i < m; ++i) a[i + j * m] -= l * a[i + k * m];
-        }
-        const double pivot = std::sqrt(std::max(a[j + j * m], 1e-12));
-        for (std::size_t i = j; i < m; ++i) a[i + j * m] /= pivot;
-    }
-    for (std::size_t i = 0; i < m; ++i) {
-        for (std::size_t k = 0; k < i; ++k) b[i] -= a[i + k * m] * b[k];
-        b[i] /= a[i + i * m];
-    }
-    for (std::size_t i = m; i-- > 0;) {
-        for (std::size_t k = i + 1; k < m; ++k) b[i] -= a[k + i * m] * b[k];
-        b[i] /= a[i + i * m];
-    }
 }
 
 } // namespace
@@ -80,7 +60,11 @@ LogisticFit fitLogistic(const std::vector<std::vector<float>>& columns, const st
             g[j] = sum - (j + 1 < m ? penalty * fit.coefficients[j] / scale[j] : 0.0);
             h[j + j * m] += j + 1 < m ? penalty : 1e-6;
         }
-        solveSymmetric(h, g);
+        std::vector<int> pivots(m);
+        for (std::size_t j = 1; j < m; ++j)
+            for (std::size_t i = 0; i < j; ++i)
+                h[i + j * m] = h[j + i * m]; // only the lower triangle was set
+        if (Fn::Numeric::Lapack<double>::gesv(m, 1, h.data(), pivots.data(), g.data()) != 0) break;
         for (std::size_t j = 0; j + 1 < m; ++j) fit.coefficients[j] += g[j] * scale[j];
         fit.intercept += g[m - 1];
     }

@@ -4,7 +4,6 @@
 #include "fn/numeric/blas.h"
 #include "train/calibration.h"
 #include "train/face_training.h"
-#include "train/feature_measurement.h"
 #include "train/feature_training.h"
 #include "train/l5_training.h"
 
@@ -20,13 +19,12 @@ int main(int argc, char** argv) {
     int threads = 2;
     using Task =
         void (*)(const std::filesystem::path& data, const std::filesystem::path& folder, std::uint64_t seed);
-    const auto command = [&](const char* name, const char* doc, const char* option, const char* optionDoc,
-                             Task task) {
+    const auto training = [&](const char* name, const char* doc, Task task) {
         CLI::App* const sub = app.add_subcommand(name, doc);
         sub->add_option("--data", data, "Root of the labelled images")
             ->required()
             ->check(CLI::ExistingDirectory);
-        sub->add_option(option, folder, optionDoc)->required();
+        sub->add_option("--out", folder, "Folder that gets the model files")->required();
         sub->add_option("--seed", seed, "Seed of all random choices")->capture_default_str();
         sub->add_option("--threads", threads, "Threads of the linear algebra")->capture_default_str();
         sub->callback([&, task] {
@@ -34,16 +32,11 @@ int main(int argc, char** argv) {
             task(data, folder, seed);
         });
     };
-    const auto training = [&](const char* name, const char* doc, Task task) {
-        command(name, doc, "--out", "Folder that gets the model files", task);
-    };
     training("face", "The eleven files of the face finder", Train::trainFaceFinder);
     training("eyes", "The file of the eyes finder", Train::trainEyesFinder);
     training("mouth", "The file of the mouth finder", Train::trainMouthFinder);
     training("bridge", "The file of the nose bridge finder", Train::trainBridgeFinder);
     training("l5", "The transformation and the mapping files of the L5 comparison", Train::trainL5);
-    command("measure-features", "Prints how well eyes, mouth and nose bridge are found on the test images",
-            "--etc", "Folder of the model files", Train::measureFeatureFinders);
     std::string scores, algorithm;
     CLI::App* const calibration = app.add_subcommand(
         "calibrate", "The score and rate mapping files of a comparison algorithm, from scores of pairs");

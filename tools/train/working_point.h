@@ -22,6 +22,20 @@ struct WorkingStep {
 void setWorkingPoint(Eye::Implementation::TrainedSvm& svm, const std::vector<Signs>& faces,
                      const std::vector<WorkingStep>& steps);
 
+/// The same for a machine of degree 2, whose earlier steps can be met exactly: alphas between two steps take
+/// up a change that moves the scores of all `windows` alike, as nearly as there is one.
+void setWorkingPoints(Eye::Implementation::TrainedSvm& svm, const std::vector<Signs>& faces,
+                      const std::vector<WorkingStep>& steps, const std::vector<Signs>& windows);
+
+/// A covariance from the lower triangle of a sum of squares, damped so that it can be inverted.
+std::vector<double> damped(const std::vector<float>& lower, std::size_t samples);
+/// The change of weights that raises what they weight by 1 in the mean and changes it least from one to
+/// another. @param covariance of what is weighted, n by n, positive definite @param mean n values
+std::vector<double> evenRaise(const std::vector<double>& covariance, const std::vector<double>& mean);
+
+/// What a window adds to the score of a machine of degree 2 for each unit of an alpha.
+float response(const Eye::Implementation::TrainedSvm& svm, const Signs& window, std::size_t vector);
+
 /// The cascade of these steps.
 Eye::Implementation::CascadeSettings settingsOf(const std::string& file,
                                                 const std::vector<WorkingStep>& steps);

@@ -2,6 +2,7 @@
 
 #include "eye/cara/combined_cascade.h"
 #include "eye/cara/face_pyramid.h"
+#include "eye/cara/first_test.h"
 #include "eye/cara/frame_scale_sequencer.h"
 #include "eye/cara/overlap_removal.h"
 #include "eye/cara/sod_image.h"
@@ -259,10 +260,14 @@ std::vector<PosWithOrientations> FaceFinder::Impl::firstStages(const SodImage& s
     std::vector<PosWithOrientations> passed;
     Fn::SignValueVector<int> window(SodImage::windowBits);
     unsigned char* const bytes = window.exclusiveBytes();
+    // A still image is looked at everywhere; a frame of a stream at few places.
+    const std::vector<unsigned char> accepted =
+        sequencer.active() ? std::vector<unsigned char>() : acceptedWindows(disc1A_, sods);
     sequencer.forEachPosition([&](std::uint32_t x, std::uint32_t y) {
         float score;
+        if (!accepted.empty() && !accepted[std::size_t{y} * sods.gridWidth() + x]) return;
         sods.getWindow(x, y, bytes);
-        if (!disc1A_(window, score)) return;
+        if (accepted.empty() && !disc1A_(window, score)) return;
         std::uint32_t rotations = 0;
         for (std::size_t i = 0; i < cascades_.size(); ++i)
             if (cascades_[i].disc1B(window, score) && cascades_[i].disc1C(window, score))

@@ -57,8 +57,9 @@ constexpr std::uint64_t allLow = 0x0F0F0F0F0F0F0F0F;
 SodImage::SodImage(const FNImage<unsigned short>& image)
     : gridWidth_(gridSize(image.h() > windowSize ? image.w() : 0)),
       gridHeight_(gridSize(image.w() > windowSize ? image.h() : 0)),
-      stride_(image.h() > 1 ? image.h() - 1 : 0), bytes_(image.w() > 1 ? stride_ * (image.w() - 1) : 0) {
-    if (bytes_.empty()) return;
+      stride_(image.h() > 1 ? image.h() - 1 : 0),
+      bytes_(image.w() > 1 ? stride_ * (image.w() - 1) + readableBehind : readableBehind) {
+    if (image.w() < 2 || image.h() < 2) return;
     const std::vector<unsigned short> columns = transposed(image);
     std::vector<unsigned char> left(stride_), codes(stride_);
     for (std::uint32_t x = 0; x + 1 < image.w(); ++x) {
@@ -74,7 +75,7 @@ SodImage::SodImage(const FNImage<unsigned short>& image)
 }
 
 void SodImage::getWindow(std::uint32_t x, std::uint32_t y, unsigned char* window) const noexcept {
-    const unsigned char* column = bytes_.data() + x * stride_ + y;
+    const unsigned char* column = this->column(x) + y;
     std::uint64_t upperMask = allLow, lowerMask = allLow; // of the first column
     for (std::uint32_t c = 0; c < windowSize; ++c, column += stride_, window += windowSize) {
         std::uint64_t halves[2];

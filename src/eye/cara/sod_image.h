@@ -35,6 +35,12 @@ public:
     /// columns of 16 bytes, with the high nibbles of its first row and column cleared.
     void getWindow(std::uint32_t x, std::uint32_t y, unsigned char* window) const noexcept;
 
+    /// The bytes of a column, as operator() gives them, and how far it is to the next column. Behind the last
+    /// column, so many bytes more may be read.
+    static constexpr std::size_t readableBehind = 256;
+    const unsigned char* column(std::uint32_t x) const noexcept { return bytes_.data() + x * stride_; }
+    std::size_t stride() const noexcept { return stride_; }
+
     /// The same window in the order in which discriminators are trained: the low nibbles of all positions row
     /// by row, then the high nibbles of those outside the first row and column.
     Fn::SignValueVector<int> trainedWindow(std::uint32_t x, std::uint32_t y) const;

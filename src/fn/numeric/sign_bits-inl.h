@@ -55,6 +55,47 @@ HWY_INLINE std::uint32_t differingBitsOfBlocks(const unsigned char* a, const uns
 
 #endif
 
+/// The same for one string against eight, which begin `stride` bytes apart; one register holds a block of the
+/// one string for all of them, and their sums are brought together at the end.
+HWY_INLINE void differingBitsOfEight(const unsigned char* a, const unsigned char* b, std::size_t stride,
+                                     std::size_t blocks, std::uint32_t* counts) {
+#if HWY_TARGET <= HWY_AVX3_DL
+    namespace hn = hwy::HWY_NAMESPACE;
+    constexpr std::size_t block = 64;
+    const hn::FixedTag<std::uint64_t, 8> d64;
+    const hn::Half<decltype(d64)> half;
+    using Sums = hn::Vec<decltype(d64)>;
+    const auto words = [&](const unsigned char* bytes)
+                           HWY_ATTR { return hn::LoadU(d64, reinterpret_cast<const std::uint64_t*>(bytes)); };
+    Sums s0 = hn::Zero(d64), s1 = s0, s2 = s0, s3 = s0, s4 = s0, s5 = s0, s6 = s0, s7 = s0;
+    for (std::size_t i = 0; i < block * blocks; i += block) {
+        const Sums x = words(a + i);
+        const auto count = [&](Sums& sum, std::size_t k) HWY_ATTR {
+            sum = hn::Add(sum, hn::PopulationCount(hn::Xor(x, words(b + k * stride + i))));
+        };
+        count(s0, 0), count(s1, 1), count(s2, 2), count(s3, 3);
+        count(s4, 4), count(s5, 5), count(s6, 6), count(s7, 7);
+    }
+    // Two sums at a time, by halves of their 128-bit parts; then those parts.
+    const auto pair = [&](Sums u, Sums v) HWY_ATTR {
+        const Sums both = hn::Add(hn::InterleaveLower(d64, u, v), hn::InterleaveUpper(d64, u, v));
+        return hn::Add(hn::LowerHalf(half, both), hn::UpperHalf(half, both));
+    };
+    const auto store = [&](hn::Vec<decltype(half)> two, std::size_t k) HWY_ATTR {
+        const hn::Half<decltype(half)> quarter;
+        const auto sums = hn::Add(hn::LowerHalf(quarter, two), hn::UpperHalf(quarter, two));
+        const hn::Rebind<std::uint32_t, decltype(quarter)> d32;
+        hn::StoreU(hn::TruncateTo(d32, sums), d32, counts + k);
+    };
+    store(pair(s0, s1), 0);
+    store(pair(s2, s3), 2);
+    store(pair(s4, s5), 4);
+    store(pair(s6, s7), 6);
+#else
+    for (std::size_t k = 0; k < 8; ++k) counts[k] = differingBitsOfBlocks(a, b + k * stride, blocks);
+#endif
+}
+
 } // namespace Fn::Numeric::HWY_NAMESPACE
 HWY_AFTER_NAMESPACE();
 
