@@ -10,7 +10,7 @@ void Sample::check(const Requirements& requirements) const {
     demand(requirements.intensityImage, bool(intensityImage), "intensity image");
     demand(requirements.intensityEyePositions, leftEye && rightEye, "intensity eye positions");
     demand(requirements.faceStream, bool(faceStream), "FaceStream");
-    demand(requirements.shapeData, bool(vertexImage), "shape vertex image or point set");
+    demand(requirements.shapeData, vertexImage || pointSet, "shape vertex image or point set");
     demand(requirements.shapeEyePositions, shapeLeftEye && shapeRightEye, "shape eye positions");
 }
 

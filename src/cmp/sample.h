@@ -6,6 +6,7 @@
 #include "fn/image_reference.h"
 #include "fn/vector3.h"
 #include "fn/vertex_image.h"
+#include "shapeimg/textured_point_set.h"
 
 namespace Cmp {
 
@@ -27,6 +28,9 @@ struct Sample {
     Sample(const FNImageReference& image, FNPos left, FNPos right)
         : intensityImage(new FNImageReference(image)), leftEye(new FNPos(left)), rightEye(new FNPos(right)) {}
     /// @param left,right positions in the texture
+    Sample(const ShapeImage::TexturedPointSet& shape, FNPos left, FNPos right)
+        : leftEye(new FNPos(left)), rightEye(new FNPos(right)),
+          pointSet(new ShapeImage::TexturedPointSet(shape)) {}
     Sample(const Fn::VertexImage& shape, FNPos left, FNPos right)
         : leftEye(new FNPos(left)), rightEye(new FNPos(right)), vertexImage(new Fn::VertexImage(shape)) {}
 
@@ -43,6 +47,7 @@ struct Sample {
     FNCountedPtr<FN3Vector<double>> shapeLeftEye; ///< in the coordinates of the 3D data
     FNCountedPtr<FN3Vector<double>> shapeRightEye;
     FNCountedPtr<Fn::VertexImage> vertexImage;
+    FNCountedPtr<ShapeImage::TexturedPointSet> pointSet;
 };
 
 } // namespace Cmp

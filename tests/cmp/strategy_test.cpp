@@ -198,6 +198,8 @@ TEST(Sample, NamesTheFirstItemThatIsMissing) {
     EXPECT_EQ(missing(stream, {false, true, true, true, true}), need + "intensity eye positions");
     EXPECT_EQ(missing(image, {true, true, false, true, true}), need + "shape vertex image or point set");
     EXPECT_EQ(missing(shape, {false, true, false, true, true}), need + "shape eye positions");
+    const Cmp::Sample points(ShapeImage::TexturedPointSet(), {1, 2}, {3, 4});
+    EXPECT_EQ(missing(points, {false, true, false, true, false}), "nothing thrown");
     EXPECT_NE(empty.id, image.id);
 }
 
