@@ -41,7 +41,7 @@ extern "C" int LLVMFuzzerTestOneInput(const unsigned char* data, std::size_t siz
             for (unsigned long i = 0; i < frames; ++i) {
                 const auto frame = stream[i];
                 tolerate([&] { frame.faceInfo(); });
-                tolerate([&] { frame.getFaceForID(id, Cmp::EvidenceFrame::THUMBNAIL); });
+                tolerate([&, &track = id] { frame.getFaceForID(track, Cmp::EvidenceFrame::THUMBNAIL); });
                 // Large frames are made as they should be, but take the fuzzer's time.
                 tolerate([&] {
                     if (size < 4096) frame.img(i % 2 == 1);

@@ -179,6 +179,7 @@ private:
 } // namespace
 
 PCLD::PCLD(const L5Settings& settings) : core_(new Core(settings)) {}
+PCLD::PCLD(const PCLD&) = default;
 PCLD::~PCLD() = default;
 
 std::string PCLD::name() const {

@@ -21,6 +21,7 @@ public:
 
     /// Reads the trained files. @throws FNEIOError, FNEBadArg
     explicit PCLD(const L5Settings& settings);
+    PCLD(const PCLD&);
     ~PCLD() override;
 
     std::string name() const override;
