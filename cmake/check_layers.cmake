@@ -8,9 +8,9 @@ foreach(file IN LISTS FILES)
     file(STRINGS ${file} includes REGEX "^[ \t]*#[ \t]*include[ \t]+\"")
     foreach(line IN LISTS includes)
         string(REGEX REPLACE "^[^\"]*\"([^\"]*)\".*" "\\1" path "${line}")
-        # fn/deployment is a subsystem of its own inside fn's folder.
-        if(path MATCHES "^fn/deployment/")
-            set(subsystem "fn/deployment")
+        # Two folders inside others are told apart from what lies around them.
+        if(path MATCHES "^(fn/deployment|orbek/implementation)/")
+            set(subsystem ${CMAKE_MATCH_1})
         else()
             string(REGEX REPLACE "/.*" "" subsystem "${path}")
         endif()

@@ -3,7 +3,7 @@
 #include "fn/deployment/app_file_config_db.h"
 #include "fn/deployment/composite_values.h"
 #include "fn/deployment/configurator_machine.h"
-#include "orbek/configuration_implementation.h"
+#include "orbek/implementation/configuration_implementation.h"
 
 namespace Orbek {
 

@@ -5,6 +5,7 @@
 #include "fn/imagefile/image_file.h"
 #include "fn/package.h"
 #include "labelled/labels.h"
+#include "support/each_target.h"
 #include "support/labelled_photos.h"
 #include "support/thrown.h"
 
@@ -119,7 +120,7 @@ bool same(const Locations& a, const Locations& b) {
     });
 }
 
-TEST(FaceFinderOnPhotos, GivesTheSameFromEveryThreadAndFromItsPackage) {
+TEST(FaceFinderOnPhotos, GivesTheSameFromEveryThreadInstructionSetAndPackage) {
     if (labelledPhotos().empty()) GTEST_SKIP() << "the labelled photos are not there";
     const Photo photo = testPhotos(1).front();
     Locations expected;
@@ -127,6 +128,11 @@ TEST(FaceFinderOnPhotos, GivesTheSameFromEveryThreadAndFromItsPackage) {
     Locations fromPackage;
     Engine(trainedFinder().serialize()).find(photo.image, fromPackage, 0.05, 0.5, FaceFinder::everywhere);
     EXPECT_TRUE(same(expected, fromPackage));
+    forEachTarget([&] {
+        Locations faces;
+        trainedFinder().find(photo.image, faces, 0.05, 0.5, FaceFinder::everywhere);
+        EXPECT_TRUE(same(expected, faces));
+    });
     std::vector<std::thread> threads;
     std::array<Locations, 4> results;
     for (Locations& result : results)

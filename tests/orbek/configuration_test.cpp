@@ -1,7 +1,7 @@
 #include "orbek/configuration.h"
 
 #include "fn/message/dialog.h"
-#include "orbek/configuration_implementation.h"
+#include "orbek/implementation/configuration_implementation.h"
 #include "support/scratch_folder.h"
 #include "support/thrown.h"
 

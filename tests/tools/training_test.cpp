@@ -164,13 +164,13 @@ TEST(PositionTuning, MovesThePlaceOfTheBestWindowsToTheLabel) {
             sum += machine.evaluate(faces[i]) > machine.evaluate(set.vectors[2 * i + 1]) ? 0 : 1;
         return sum;
     };
-    Train::PositionTuning tuning(svm, 0.1f);
+    Train::PositionTuning tuning(svm, 24, 0.1f);
     for (std::size_t i = 0; i + 1 < faces.size(); i += 2)
         tuning.add({{faces[i], {0.3f, 0}, 0}, {set.vectors[2 * i + 1], {0, 0}, 0}}, 1);
-    const TrainedSvm tuned = tuning.tuned(faces, {{20, -0.5, 0.95}});
+    const TrainedSvm tuned = tuning.tuned(faces, {{24, -0.5, 0.95}}, random);
     EXPECT_LT(error(svm), 0.1 * static_cast<double>(faces.size()) / 2) << "the pattern wins";
     EXPECT_GT(error(tuned), 0.8 * static_cast<double>(faces.size()) / 2) << "the windows at the place win";
-    EXPECT_NEAR(shares(tuned, faces, {{20, -0.5, 0.95}})[0], 0.95, 0.003);
+    EXPECT_NEAR(shares(tuned, faces, {{24, -0.5, 0.95}})[0], 0.95, 0.003);
 }
 
 } // namespace

@@ -28,6 +28,11 @@ std::vector<float> pick(const std::vector<float>& values, const std::vector<std:
     return picked;
 }
 
+float kernel(const TrainedSvm& svm, float product) {
+    const float value = product / svm.kernelScale + svm.kernelConstant;
+    return value * value;
+}
+
 /// The growing machine and what it makes of each sample.
 class Growth {
 public:
@@ -59,28 +64,22 @@ public:
 private:
     float sigmoid(float f) const { return 1.0f / (1.0f + std::exp(-f)); }
 
-    /// Samples by the size of their residual, with the sign of it.
-    std::vector<std::size_t> hardBatch(std::vector<float>& pulls) {
-        std::vector<double> cumulated(set_.size());
-        double sum = 0;
+    /// The vector that the samples pull for, drawn by the size of their residual.
+    Signs pulledVector() {
+        std::vector<double> residuals(set_.size());
         for (std::size_t i = 0; i < set_.size(); ++i)
-            cumulated[i] = sum += weights_[i] * std::abs(set_.labels[i] - sigmoid(decision_[i]));
-        std::uniform_real_distribution<double> uniform(0, sum);
-        std::vector<std::size_t> batch;
-        for (std::size_t k = 0; k < settings_.batch; ++k) {
-            const auto at = std::lower_bound(cumulated.begin(), cumulated.end(), uniform(random_));
-            batch.push_back(static_cast<std::size_t>(std::min<std::ptrdiff_t>(
-                at - cumulated.begin(), static_cast<std::ptrdiff_t>(set_.size()) - 1)));
-        }
+            residuals[i] = weights_[i] * std::abs(set_.labels[i] - sigmoid(decision_[i]));
+        const std::vector<std::size_t> batch = drawn(residuals, settings_.batch, random_);
+        std::vector<float> pulls;
         for (const std::size_t i : batch) pulls.push_back(set_.labels[i] > 0.5f ? 1.0f : -1.0f);
-        return batch;
+        return bestVector(svm_, expanded(set_.vectors, batch), pulls, settings_.ascents, random_);
     }
 
     void addVector() {
-        const Signs vector = bestVector();
+        const Signs vector = pulledVector();
         std::vector<float> response(set_.size());
         for (std::size_t i = 0; i < set_.size(); ++i)
-            response[i] = kernel(static_cast<float>(set_.vectors[i] * vector));
+            response[i] = kernel(svm_, static_cast<float>(set_.vectors[i] * vector));
         // A Newton step for the new alpha alone, against the mean response.
         double mean = 0, weight = 0, gain = 0, curvature = 0;
         for (std::size_t i = 0; i < set_.size(); ++i) {
@@ -104,67 +103,6 @@ private:
         svm_.supportVectors.push_back(vector);
     }
 
-    float kernel(float product) const {
-        const float value = product / svm_.kernelScale + svm_.kernelConstant;
-        return value * value;
-    }
-
-    Signs bestVector() {
-        constexpr std::size_t candidates = 6;
-        const std::uint32_t d = set_.dimension();
-        std::vector<float> pulls;
-        const std::vector<std::size_t> batch = hardBatch(pulls);
-        const std::vector<float> x = expanded(set_.vectors, batch);
-        const std::size_t b = batch.size();
-
-        // Half of the candidates shall respond to faces, half to the rest; they start at the mean pull or at
-        // a sample.
-        std::vector<float> s(d * candidates), product(b * candidates), gradient(d * candidates);
-        for (std::size_t k = 0; k < candidates; ++k) {
-            const float side = k % 2 == 0 ? 1.0f : -1.0f;
-            if (k < 2) {
-                Blas::gemv(false, d, b, side, x.data(), pulls.data(), 0.0f, &s[k * d]);
-            } else {
-                std::size_t at = random_() % b;
-                for (int tries = 0; tries < 50 && pulls[at] != side; ++tries) at = random_() % b;
-                std::copy_n(&x[at * d], d, &s[k * d]);
-            }
-            for (std::uint32_t i = 0; i < d; ++i) s[k * d + i] = s[k * d + i] >= 0 ? 1.0f : -1.0f;
-        }
-        for (int ascent = 0; ascent < settings_.ascents; ++ascent) {
-            Blas::gemm(true, false, b, candidates, d, 1.0f, x.data(), s.data(), 0.0f, product.data());
-            for (std::size_t k = 0; k < candidates; ++k)
-                for (std::size_t i = 0; i < b; ++i) {
-                    const float side = k % 2 == 0 ? pulls[i] : -pulls[i];
-                    product[k * b + i] = side * (product[k * b + i] / svm_.kernelScale + svm_.kernelConstant);
-                }
-            Blas::gemm(false, false, d, candidates, b, 1.0f, x.data(), product.data(), 0.0f, gradient.data());
-            for (std::size_t i = 0; i < s.size(); ++i) s[i] = gradient[i] >= 0 ? 1.0f : -1.0f;
-        }
-
-        Blas::gemm(true, false, b, candidates, d, 1.0f, x.data(), s.data(), 0.0f, product.data());
-        double bestGain = -1;
-        std::size_t best = 0;
-        for (std::size_t k = 0; k < candidates; ++k) {
-            double mean = 0, square = 0, pull = 0, pullSum = 0;
-            for (std::size_t i = 0; i < b; ++i) {
-                const double value = kernel(product[k * b + i]);
-                mean += value;
-                square += value * value;
-                pull += pulls[i] * value;
-                pullSum += pulls[i];
-            }
-            mean /= static_cast<double>(b);
-            const double variance = square / static_cast<double>(b) - mean * mean;
-            const double gain = std::abs(pull - pullSum * mean) / std::sqrt(variance + 1e-12);
-            if (gain > bestGain) {
-                bestGain = gain;
-                best = k;
-            }
-        }
-        return signsOf(&s[best * d], d);
-    }
-
     void refit(int steps) {
         fit_ = fitLogistic(group_, set_.labels, weights_, offset_, settings_.penalty, fit_, steps);
         for (std::size_t i = 0; i < set_.size(); ++i) {
@@ -184,6 +122,71 @@ private:
 };
 
 } // namespace
+
+Signs bestVector(const TrainedSvm& svm, const std::vector<float>& batch, const std::vector<float>& pulls,
+                 int ascents, Random& random) {
+    constexpr std::size_t candidates = 6;
+    const std::size_t b = pulls.size(), d = batch.size() / b;
+    // Half of the candidates shall respond to what is pulled up, half to the rest; they start at the mean
+    // pull or at a sample.
+    std::vector<float> s(d * candidates), product(b * candidates), gradient(d * candidates);
+    for (std::size_t k = 0; k < candidates; ++k) {
+        const float side = k % 2 == 0 ? 1.0f : -1.0f;
+        if (k < 2) {
+            Blas::gemv(false, d, b, side, batch.data(), pulls.data(), 0.0f, &s[k * d]);
+        } else {
+            std::size_t at = random() % b;
+            for (int tries = 0; tries < 50 && pulls[at] * side <= 0; ++tries) at = random() % b;
+            std::copy_n(&batch[at * d], d, &s[k * d]);
+        }
+        for (std::size_t i = 0; i < d; ++i) s[k * d + i] = s[k * d + i] >= 0 ? 1.0f : -1.0f;
+    }
+    for (int ascent = 0; ascent < ascents; ++ascent) {
+        Blas::gemm(true, false, b, candidates, d, 1.0f, batch.data(), s.data(), 0.0f, product.data());
+        for (std::size_t k = 0; k < candidates; ++k)
+            for (std::size_t i = 0; i < b; ++i) {
+                const float side = k % 2 == 0 ? pulls[i] : -pulls[i];
+                product[k * b + i] = side * (product[k * b + i] / svm.kernelScale + svm.kernelConstant);
+            }
+        Blas::gemm(false, false, d, candidates, b, 1.0f, batch.data(), product.data(), 0.0f, gradient.data());
+        for (std::size_t i = 0; i < s.size(); ++i) s[i] = gradient[i] >= 0 ? 1.0f : -1.0f;
+    }
+
+    Blas::gemm(true, false, b, candidates, d, 1.0f, batch.data(), s.data(), 0.0f, product.data());
+    double bestGain = -1;
+    std::size_t best = 0;
+    for (std::size_t k = 0; k < candidates; ++k) {
+        double mean = 0, square = 0, pull = 0, pullSum = 0;
+        for (std::size_t i = 0; i < b; ++i) {
+            const double value = kernel(svm, product[k * b + i]);
+            mean += value;
+            square += value * value;
+            pull += pulls[i] * value;
+            pullSum += pulls[i];
+        }
+        mean /= static_cast<double>(b);
+        const double variance = square / static_cast<double>(b) - mean * mean;
+        const double gain = std::abs(pull - pullSum * mean) / std::sqrt(variance + 1e-12);
+        if (gain > bestGain) {
+            bestGain = gain;
+            best = k;
+        }
+    }
+    return signsOf(&s[best * d], static_cast<std::uint32_t>(d));
+}
+
+std::vector<std::size_t> drawn(const std::vector<double>& weights, std::size_t n, Random& random) {
+    std::vector<double> cumulated(weights.size());
+    std::partial_sum(weights.begin(), weights.end(), cumulated.begin());
+    std::uniform_real_distribution<double> uniform(0, cumulated.back());
+    std::vector<std::size_t> chosen;
+    for (std::size_t k = 0; k < n; ++k) {
+        const auto at = std::lower_bound(cumulated.begin(), cumulated.end(), uniform(random));
+        chosen.push_back(static_cast<std::size_t>(std::min<std::ptrdiff_t>(
+            at - cumulated.begin(), static_cast<std::ptrdiff_t>(weights.size()) - 1)));
+    }
+    return chosen;
+}
 
 TrainedSvm trainDot(const SignSet& set, std::size_t count, Random& random) {
     constexpr std::size_t mostSamples = 50000;

@@ -26,4 +26,14 @@ struct GrowthSettings {
 Eye::Implementation::TrainedSvm growPolynomial(const SignSet& set, const GrowthSettings& settings,
                                                Random& random);
 
+/// The sign vector whose response in a machine of degree 2 goes best with the pulls of samples: the local
+/// optimum reached by iterating s <- sign(gradient).
+/// @param batch samples as floats of +1 and -1, one column for each
+/// @param pulls for each sample, above 0 if the response shall be high there
+Signs bestVector(const Eye::Implementation::TrainedSvm& svm, const std::vector<float>& batch,
+                 const std::vector<float>& pulls, int ascents, Random& random);
+
+/// n indices, drawn with replacement with probabilities in proportion to the weights.
+std::vector<std::size_t> drawn(const std::vector<double>& weights, std::size_t n, Random& random);
+
 } // namespace Train

@@ -103,7 +103,7 @@ public:
     TrainedSvm run(const std::filesystem::path& data) {
         constexpr std::size_t mostFaces = 14000, mostDevFaces = 2500;
         constexpr double smallShare = 0.3;
-        constexpr std::size_t vectorsOfRounds[] = {60, 120};
+        constexpr std::size_t vectorsOfRounds[] = {60, 120}, vectorsThatTell = 150;
         faces_ = loadLabelledFaces(data, Labelled::Split::train, mostFaces, smallShare, random_);
         devFaces_ = loadLabelledFaces(data, Labelled::Split::dev, mostDevFaces, smallShare, random_);
         collect(2, [&](const Signs&) { return static_cast<float>(random_() >> 40); });
@@ -116,11 +116,12 @@ public:
                 return score > threshold ? score : Hardest::ignored;
             });
         }
-        return tuned(grown(settings_.steps.back().vectors));
+        return tuned(grown(vectorsThatTell));
     }
 
+    /// The machine and more vectors that bring the place that is found to the label.
     TrainedSvm tuned(const TrainedSvm& machine) {
-        PositionTuning tuning(machine, settings_.errorScale);
+        PositionTuning tuning(machine, settings_.steps.back().vectors, settings_.errorScale);
         for (const LabelledFace& face : faces_)
             for (const Target& target : targets_(face, random_)) {
                 std::vector<SearchedWindow> windows;
@@ -129,9 +130,9 @@ public:
                         windows.push_back({trainedOrder_(signs), (centre - target.truth) / target.eyeDistance,
                                            2 * std::log(size)});
                     });
-                tuning.add(std::move(windows), face.byHand ? handWeight : 1.0f);
+                tuning.add(windows, face.byHand ? handWeight : 1.0f);
             }
-        return tuning.tuned(bestWindows(machine), settings_.steps);
+        return tuning.tuned(bestWindows(machine), settings_.steps, random_);
     }
 
 private:

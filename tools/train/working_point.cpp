@@ -21,23 +21,6 @@ double kernel(const TrainedSvm& svm, const Signs& x, std::size_t vector) {
     return svm.kernel == TrainedSvm::Kernel::Dot ? x * svm.supportVectors[vector] : response(svm, x, vector);
 }
 
-/// What the sums of the wanted share of faces reach at each step.
-std::vector<double> reachedSums(const TrainedSvm& svm, const std::vector<Signs>& faces,
-                                const std::vector<WorkingStep>& steps) {
-    std::vector<double> sums(faces.size(), 0.0), reached;
-    std::size_t seen = 0;
-    for (const WorkingStep& step : steps) {
-        for (; seen < step.vectors; ++seen)
-            for (std::size_t i = 0; i < faces.size(); ++i)
-                sums[i] += svm.alphas[seen] * kernel(svm, faces[i], seen);
-        std::vector<double> sorted = sums;
-        const auto rank = static_cast<std::ptrdiff_t>((1 - step.keep) * static_cast<double>(sorted.size()));
-        std::nth_element(sorted.begin(), sorted.begin() + rank, sorted.end());
-        reached.push_back(sorted[static_cast<std::size_t>(rank)]);
-    }
-    return reached;
-}
-
 double medianScore(const TrainedSvm& svm, const std::vector<Signs>& faces) {
     std::vector<double> scores;
     for (const Signs& face : faces) scores.push_back(svm.evaluate(face));
@@ -62,6 +45,22 @@ std::vector<double> evenRaise(const std::vector<double>& covariance, const std::
     const double gain = std::inner_product(mean.begin(), mean.end(), raise.begin(), 0.0);
     for (double& value : raise) value /= gain;
     return raise;
+}
+
+std::vector<double> reachedSums(const TrainedSvm& svm, const std::vector<Signs>& faces,
+                                const std::vector<WorkingStep>& steps) {
+    std::vector<double> sums(faces.size(), 0.0), reached;
+    std::size_t seen = 0;
+    for (const WorkingStep& step : steps) {
+        for (; seen < step.vectors; ++seen)
+            for (std::size_t i = 0; i < faces.size(); ++i)
+                sums[i] += svm.alphas[seen] * kernel(svm, faces[i], seen);
+        std::vector<double> sorted = sums;
+        const auto rank = static_cast<std::ptrdiff_t>((1 - step.keep) * static_cast<double>(sorted.size()));
+        std::nth_element(sorted.begin(), sorted.begin() + rank, sorted.end());
+        reached.push_back(sorted[static_cast<std::size_t>(rank)]);
+    }
+    return reached;
 }
 
 void setWorkingPoint(TrainedSvm& svm, const std::vector<Signs>& faces,

@@ -27,6 +27,10 @@ void setWorkingPoint(Eye::Implementation::TrainedSvm& svm, const std::vector<Sig
 void setWorkingPoints(Eye::Implementation::TrainedSvm& svm, const std::vector<Signs>& faces,
                       const std::vector<WorkingStep>& steps, const std::vector<Signs>& windows);
 
+/// What the sums of the wanted share of faces reach at each step, without the bias.
+std::vector<double> reachedSums(const Eye::Implementation::TrainedSvm& svm, const std::vector<Signs>& faces,
+                                const std::vector<WorkingStep>& steps);
+
 /// A covariance from the lower triangle of a sum of squares, damped so that it can be inverted.
 std::vector<double> damped(const std::vector<float>& lower, std::size_t samples);
 /// The change of weights that raises what they weight by 1 in the mean and changes it least from one to

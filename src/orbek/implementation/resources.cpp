@@ -1,9 +1,9 @@
-#include "orbek/resources.h"
+#include "orbek/implementation/resources.h"
 
 #include "eye/cara/face_finder.h"
 #include "eye/ojo/eyes_finder.h"
 #include "fn/message/translator.h"
-#include "orbek/orbek_properties.h"
+#include "orbek/implementation/orbek_properties.h"
 
 namespace Orbek {
 

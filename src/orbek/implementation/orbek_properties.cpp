@@ -1,7 +1,8 @@
-#include "orbek/orbek_properties.h"
+#include "orbek/implementation/orbek_properties.h"
 
 #include "eye/cara/face_finder.h"
 #include "eye/ojo/eyes_finder.h"
+#include "eye/tracker/reference_face_tracker.h"
 #include "fg/capture_types.h"
 #include "fn/deployment/composite_values.h"
 
@@ -61,7 +62,7 @@ std::list<Property> members() {
         pending("StreamIdentifier", "Kx::StreamIdentifier", "Stream Identifier"),
         pending("SetVerifier", "Kx::SetRecognizer", "Set Verifier"),
         pending("SetIdentifier", "Kx::SetIdentifier", "Set Identifier"),
-        pending("FaceTracker", "Eye::ReferenceFaceTracker", "Face Tracker Engine"),
+        property<Eye::ReferenceFaceTracker>::create("FaceTracker", "Face Tracker Engine"),
         pending("PortraitAnalyzer", "Cmp::Portrait::Analyzer", "Portrait Analyzer"),
         pending("ISOFullFrontalTest", "Kx::ISO_19794_5::FullFrontal::Test",
                 "ISO 19794-5 Full Frontal images assessment"),

@@ -2,7 +2,7 @@
 
 #include "fn/deployment/configurator.h"
 #include "orbek/configuration.h"
-#include "orbek/resources.h"
+#include "orbek/implementation/resources.h"
 
 namespace Orbek {
 

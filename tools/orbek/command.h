@@ -1,0 +1,26 @@
+#pragma once
+
+#include <functional>
+
+#include <CLI/CLI.hpp>
+
+namespace Orbek::Tool {
+
+/// What the program returns.
+enum ExitStatus : int {
+    done = 0,
+    failed = 1,     ///< wrong usage, a broken configuration, a folder that cannot be written
+    unreadable = 2, ///< an input could not be read; the others are done
+};
+
+/// A command of the program.
+struct Command {
+    CLI::App* app;            ///< its options
+    std::function<int()> run; ///< @return an ExitStatus. @throws std::exception for what stops it
+};
+
+/// Each adds one command to the program, and lives in a file of its own.
+Command findCommand(CLI::App& program);
+Command trackCommand(CLI::App& program);
+
+} // namespace Orbek::Tool

@@ -1,0 +1,48 @@
+#pragma once
+
+#include "orbek/face_finder.h"
+
+#include <cstddef>
+#include <mutex>
+#include <string>
+
+#include <nlohmann/json_fwd.hpp>
+
+namespace Orbek::Tool {
+
+/// The results of a command on standard output, its complaints on standard error, and there, if it is a
+/// terminal, a progress bar. May be used from several threads.
+class Output {
+public:
+    /// @param steps until everything is done
+    explicit Output(std::size_t steps);
+    /// Removes the bar.
+    ~Output();
+    Output(const Output&) = delete;
+    Output& operator=(const Output&) = delete;
+
+    void result(const nlohmann::ordered_json& json);
+    void complaint(const std::string& file, const std::string& reason);
+    /// One more step is done.
+    void step();
+    /// Whether there was a complaint.
+    bool complained() const { return complained_; }
+
+private:
+    void removeBar();
+    void drawBar();
+
+    std::mutex mutex_;
+    std::size_t steps_, done_ = 0;
+    bool terminal_;
+    int shownWidth_ = -1; ///< of the filled part, -1 if there is no bar
+    bool complained_ = false;
+};
+
+/// A number as results show it, with so many decimals at most.
+double rounded(double value, int decimals);
+
+/// Adds x, y, eye_distance, confidence and rotation.
+void addFace(nlohmann::ordered_json& json, const Face::Location& face);
+
+} // namespace Orbek::Tool
