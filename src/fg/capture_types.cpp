@@ -4,35 +4,6 @@ namespace FG {
 
 using namespace Fn::Deployment;
 
-namespace {
-
-struct SortingKinds {
-    static std::list<std::string> enumeration() { return {"No", "AscendingByName", "DescendingByName"}; }
-};
-
-struct GrabberKind {
-    const char* name;
-    const char* doc;
-};
-
-constexpr GrabberKind kindsBeforeImageFiles[] = {
-    {"DirectShowDevice", "Direct Show windows capture device"},
-    {"DirectShowURL", "Direct Show video stream"},
-    {"WMF", "Windows Media Foundation video stream"},
-    {"Basler", "Basler cameras"},
-    {"GStreamer", "GStreamer video streams"},
-    {"VideoForLinux2", "Video for Linux (2) capture devices"},
-    {"VideoForLinux", "Video for Linux capture devices"},
-    {"Http", "Network cameras using HTTP as transmission protcol"},
-    {"Prosilica", "Prosilica cameras"},
-    {"PtGrey", "PointGrey cameras"},
-    {"UEye", "IDS Ueye cameras"},
-    {"Lumenera", "Lumenera cameras"},
-    {"DSLR", "DSLRCamera via PTP"},
-};
-
-} // namespace
-
 Type MultiFileLocations::define() {
     return Type(typeId(), "Multiple image file locations",
                 properties(property<String>::create("Directory", "Directory with image names"),
@@ -41,8 +12,6 @@ Type MultiFileLocations::define() {
 }
 
 Type MultiFileDef::define() {
-    using OptionalFloat = AlternativeN<None, Float>;
-    using OptionalUInt = AlternativeN<None, UInt>;
     return Type(
         typeId(), "Settings for multiple image file grabber, supported image formats are Jpeg, Png, Bmp, Pgm",
         properties(
@@ -52,8 +21,8 @@ Type MultiFileDef::define() {
                 "ImageCaching", true,
                 "If it is set to true, than during the initialization all image files "
                 "are prefetched and stored in a data cache."),
-            property<Enum<SortingKinds>>::create(
-                "Sorting", "Indicates whether and how to perform a sorting of the input files"),
+            property<Sorting>::create("Sorting",
+                                      "Indicates whether and how to perform a sorting of the input files"),
             propertyWithDefault<Bool>::create("ContinuousPlayback", true,
                                               "Indicates whether to loop continuously through the image "
                                               "sequence. If it is set to false and all "
@@ -85,12 +54,19 @@ Type MultiFileDef::define() {
 
 Type SupportedFrameGrabberDefs::define() {
     std::list<Property> kinds;
-    // The grabbers themselves are not built yet: records without members.
-    for (const GrabberKind& kind : kindsBeforeImageFiles)
-        kinds.emplace_back(Type(std::string("FG::") + kind.name, kind.doc, "", false), kind.name, "",
-                           kind.doc, false);
-    kinds.push_back(property<MultiFileDef>::create("ImageFiles", "capture device emulation using files"));
+    for (const FrameGrabberKind& kind : frameGrabberKinds) {
+        const std::string name(kind.name), doc(kind.doc);
+        if (name == "ImageFiles")
+            kinds.push_back(property<MultiFileDef>::create(name, doc));
+        else // a driver beside this library: a record without members
+            kinds.emplace_back(Type("FG::" + name, doc, "", false), name, "", doc, false);
+    }
     return Type(typeId(), "Supported Frame Grabbers", kinds, "", false);
+}
+
+Type DllFrameGrabberFactoryCacheDef::define() {
+    return Type(typeId(), "Pathes to the shared libraries of the Supported Frame Grabbers",
+                properties(property<DllPaths>::create("DllPaths", "The Paths of the dlls")), "", false);
 }
 
 } // namespace FG

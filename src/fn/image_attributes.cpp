@@ -10,6 +10,7 @@ namespace {
 constexpr const char* sourceNameKey = "SRCNAME";
 constexpr const char* eyePositionsKey = "EYEPOS";
 constexpr const char* captureTimeKey = "CaptureTime";
+constexpr const char* exposureTimeKey = "ExposureTime";
 
 Optional<std::string> find(const FNImageAttributes& attributes, const char* key) {
     const auto entry = attributes.find(key);
@@ -64,6 +65,21 @@ void addImageCaptureTime(FNImageAttributes& attributes, const TimeStamp& time) {
 Optional<TimeStamp> getImageCaptureTime(const FNImageAttributes& attributes) {
     const Optional<std::string> text = find(attributes, captureTimeKey);
     return text.isSet() ? Optional<TimeStamp>(TimeStamp::fromString(*text)) : Optional<TimeStamp>();
+}
+
+void addImageExposureTime(FNImageAttributes& attributes, unsigned int microseconds) {
+    attributes[exposureTimeKey] = std::to_string(microseconds);
+}
+
+Optional<unsigned int> getImageExposureTime(const FNImageAttributes& attributes) {
+    const Optional<std::string> text = find(attributes, exposureTimeKey);
+    if (!text.isSet()) return {};
+    unsigned int microseconds = 0;
+    const char* const end = text->data() + text->size();
+    const auto [behind, error] = std::from_chars(text->data(), end, microseconds);
+    if (error != std::errc() || behind != end)
+        FN_THROW(FNEBadFormat, "ExposureTime: '" + *text + "' is not a number of microseconds");
+    return microseconds;
 }
 
 } // namespace Fn

@@ -34,4 +34,9 @@ void addImageCaptureTime(FNImageAttributes& attributes, const TimeStamp& time);
 /// @throws FNEBadFormat if the value is not a time stamp.
 Optional<TimeStamp> getImageCaptureTime(const FNImageAttributes& attributes);
 
+/// Key "ExposureTime": a decimal number of microseconds.
+void addImageExposureTime(FNImageAttributes& attributes, unsigned int microseconds);
+/// @throws FNEBadFormat if the value is no such number.
+Optional<unsigned int> getImageExposureTime(const FNImageAttributes& attributes);
+
 } // namespace Fn

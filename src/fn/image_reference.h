@@ -138,4 +138,7 @@ public:
                                              const Fn::ImageLimits& limits);
 
     static FNImageReference create(const Fn::Package& package) { return FNImageReference(package); }
+
+    /// The same pixels, shared, with attributes and a strategy that can be changed on their own.
+    static FNImageReference duplicate(const FNImageReference& image);
 };

@@ -218,6 +218,25 @@ template FNImageReference FNImageReferenceFactory::create(const FNImage<Fn::Bgra
 template FNImageReference FNImageReferenceFactory::create(const FNImage<Fn::Rgb48>&, const FNImageAttributes&,
                                                           Strategy);
 
+FNImageReference FNImageReferenceFactory::duplicate(const FNImageReference& image) {
+    const auto of = [&](const auto& pixels) {
+        return create(pixels, image.attributes(), image.getSerializationStrategy());
+    };
+    switch (image.native()) {
+    case FNImageReference::MONO8:
+        return of(image.toMono8());
+    case FNImageReference::MONO16:
+        return of(image.toMono16());
+    case FNImageReference::MONO_FLOAT:
+        return of(image.toMonoFloat());
+    case FNImageReference::RGB48:
+        return of(image.toRgb48());
+    case FNImageReference::BGRA32:
+        break;
+    }
+    return of(image.toBgra32());
+}
+
 FNImageReference FNImageReferenceFactory::createCompressed(const FNRMem<unsigned char>& file,
                                                            const FNImageAttributes& attributes) {
     return createCompressed(file, attributes, Fn::ImageLimits());

@@ -113,6 +113,8 @@ TEST_F(Reports, LandmarkErrorsAreThoseOfTheWorseEyeInEyeDistances) {
     ASSERT_EQ(report.eyes.errors.size(), 1u);
     // Face at (20, 52) of width 22: the right eye at (33, 52), its label at (30, 50).
     EXPECT_FLOAT_EQ(report.eyes.errors[0], std::sqrt(13.0f) / 20);
+    EXPECT_FLOAT_EQ(report.rightOffset.x, 0.15f);
+    EXPECT_NEAR(report.eyesCentred.errors.at(0), 0, 1e-6) << "a single face is its own mean";
     EXPECT_EQ(report.eyes.within(0.1f), 0);
     EXPECT_EQ(report.eyes.within(0.2f), 1);
     ASSERT_EQ(report.mouth.errors.size(), 1u);

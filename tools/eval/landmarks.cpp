@@ -15,7 +15,8 @@ namespace {
 /// What was measured on one face; nothing where the landmark was not looked for or has no label.
 struct Measured {
     bool faceFound = false, looked = false;
-    std::optional<float> eyes, mouth, bridge;
+    std::optional<std::pair<FNPos, FNPos>> eyes; ///< found less labelled, eye distances
+    std::optional<float> mouth, bridge;
     const FaceTruth* truth = nullptr;
 };
 
@@ -42,10 +43,15 @@ Measured measure(const LandmarkFinders& finders, const FNImageReference& image,
     if (!foundFirst || !foundSecond) return result;
     result.looked = true;
     const float distance = truth.eyeDistance();
-    result.eyes = std::max(length(first.pos - truth.leftEye), length(second.pos - truth.rightEye)) / distance;
+    result.eyes = {(first.pos - truth.leftEye) / distance, (second.pos - truth.rightEye) / distance};
     result.mouth = errorOf(finders.mouth, truth.mouth, first, second, image, distance);
     result.bridge = errorOf(finders.bridge, truth.bridge, first, second, image, distance);
     return result;
+}
+
+std::optional<float> worseEye(const Measured& face, FNPos leftOffset = {0, 0}, FNPos rightOffset = {0, 0}) {
+    if (!face.eyes) return {};
+    return std::max(length(face.eyes->first - leftOffset), length(face.eyes->second - rightOffset));
 }
 
 void add(LandmarkErrors& errors, const std::optional<float>& error) {
@@ -90,6 +96,7 @@ LandmarkReport measureLandmarks(const LandmarkFinders& finders, const Selection&
     LandmarkReport report;
     report.pictures = pictures.size();
     report.eyes.name = "eyes, the worse one";
+    report.eyesCentred.name = "  without the mean offsets";
     report.mouth.name = "mouth";
     report.bridge.name = "nose bridge";
     std::map<std::string, LandmarkErrors> groups;
@@ -98,15 +105,27 @@ LandmarkReport measureLandmarks(const LandmarkFinders& finders, const Selection&
             ++report.faces;
             report.facesFound += face.faceFound;
             if (face.faceFound) {
-                add(report.eyes, face.eyes);
-                add(groups[face.truth->group], face.eyes);
+                add(report.eyes, worseEye(face));
+                add(groups[face.truth->group], worseEye(face));
+                if (face.eyes) {
+                    report.leftOffset += face.eyes->first;
+                    report.rightOffset += face.eyes->second;
+                }
             }
             if (face.looked && face.truth->mouth) add(report.mouth, face.mouth);
             if (face.looked && face.truth->bridge) add(report.bridge, face.bridge);
         }
+    if (const auto found = static_cast<float>(report.eyes.errors.size()); found > 0) {
+        report.leftOffset = report.leftOffset / found;
+        report.rightOffset = report.rightOffset / found;
+    }
+    for (const std::vector<Measured>& faces : measured)
+        for (const Measured& face : faces)
+            if (face.faceFound)
+                add(report.eyesCentred, worseEye(face, report.leftOffset, report.rightOffset));
     if (groups.size() > 1)
         for (auto& [group, errors] : groups) report.eyesByGroup.emplace_back(group, errors);
-    for (LandmarkErrors* const errors : {&report.eyes, &report.mouth, &report.bridge})
+    for (LandmarkErrors* const errors : {&report.eyes, &report.eyesCentred, &report.mouth, &report.bridge})
         std::sort(errors->errors.begin(), errors->errors.end());
     for (auto& [group, errors] : report.eyesByGroup) {
         errors.name = group.empty() ? "unknown" : group;
@@ -137,7 +156,13 @@ void printLandmarks(const LandmarkReport& report, std::ostream& stream) {
                       errors.quantile(0.9));
         stream << line;
     };
-    for (const LandmarkErrors* const errors : {&report.eyes, &report.mouth, &report.bridge}) print(*errors);
+    for (const LandmarkErrors* const errors :
+         {&report.eyes, &report.eyesCentred, &report.mouth, &report.bridge})
+        print(*errors);
+    std::snprintf(line, sizeof line,
+                  "\n  mean offsets of the eyes, x and y: left %+.3f %+.3f, right %+.3f %+.3f\n",
+                  report.leftOffset.x, report.leftOffset.y, report.rightOffset.x, report.rightOffset.y);
+    stream << line;
     if (!report.eyesByGroup.empty()) stream << "\n  eyes by group\n";
     for (const auto& [group, errors] : report.eyesByGroup) print(errors);
 }
@@ -147,6 +172,7 @@ std::string landmarksJson(const LandmarkReport& report) {
                         {"faces", report.faces},
                         {"faces_found", report.facesFound},
                         {"eyes", jsonOf(report.eyes)},
+                        {"eyes_centred", jsonOf(report.eyesCentred)},
                         {"mouth", jsonOf(report.mouth)},
                         {"bridge", jsonOf(report.bridge)},
                         {"eyes_by_group", nlohmann::json::object()},

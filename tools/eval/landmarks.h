@@ -37,6 +37,10 @@ struct LandmarkErrors {
 struct LandmarkReport {
     std::size_t pictures = 0, faces = 0, facesFound = 0;
     LandmarkErrors eyes; ///< the larger error of the two, where both were found
+    /// The same with the mean offset of each eye taken off: sets of labels differ in where an eye's centre
+    /// is.
+    LandmarkErrors eyesCentred;
+    FNPos leftOffset{0, 0}, rightOffset{0, 0}; ///< mean of found less labelled, eye distances
     LandmarkErrors mouth, bridge;
     std::vector<std::pair<std::string, LandmarkErrors>> eyesByGroup;
     std::vector<std::string> failures; ///< pictures that could not be read, and why

@@ -322,9 +322,12 @@ private:
 
     void trainFinal() {
         constexpr std::size_t mostOthers = 80000;
+        constexpr double sureFaces =
+            2; // brings most faces above 0, where the tracker trusts them without eyes
         const std::vector<Signs> faces = finalFaces(faces_, 2), devFaces = finalFaces(devFaces_, 2);
         TrainedSvm svm = growPolynomial(join(faces, mineFinal(mostOthers)), {{200}, 0.1f}, random_);
         setWorkingPoint(svm, devFaces, disc3ASteps);
+        spreadScores(svm, disc3ASteps.back().threshold, sureFaces);
         save(svm, out_ / "gs2323fc.dat");
     }
 

@@ -160,9 +160,7 @@ private:
         const auto middle = scores.begin() + static_cast<std::ptrdiff_t>(scores.size() / 2);
         std::nth_element(scores.begin(), middle, scores.end());
         const double gain = mostSpread / (*middle - threshold);
-        if (gain >= 1) return;
-        for (float& alpha : svm.alphas) alpha = static_cast<float>(alpha * gain);
-        svm.bias = static_cast<float>(gain * (svm.bias + threshold) - threshold);
+        if (gain < 1) spreadScores(svm, threshold, gain);
     }
 
     /// Of the eye distances that the levels of a target's area stand for, the one that fits its face best.

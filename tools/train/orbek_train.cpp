@@ -2,8 +2,10 @@
 
 #include "fn/exception.h"
 #include "fn/numeric/blas.h"
+#include "train/calibration.h"
 #include "train/face_training.h"
 #include "train/feature_training.h"
+#include "train/l5_training.h"
 #include "train/synth_training.h"
 
 #include <CLI/CLI.hpp>
@@ -46,6 +48,17 @@ int main(int argc, char** argv) {
         ->required()
         ->check(CLI::ExistingFile);
     measure->callback([&] { Train::measureSynth(data, samples); });
+    training("l5", "The transformation and the mapping files of the L5 comparison", Train::trainL5);
+    std::string scores, algorithm;
+    CLI::App* const calibration = app.add_subcommand(
+        "calibrate", "The score and rate mapping files of a comparison algorithm, from scores of pairs");
+    calibration->add_option("--scores", scores, "Lines of \"genuine\" or \"impostor\" and a raw score")
+        ->required()
+        ->check(CLI::ExistingFile);
+    calibration->add_option("--algorithm", algorithm, "Ends the files' names: smap-ALGORITHM.dat")
+        ->required();
+    calibration->add_option("--out", folder, "Folder that gets the mapping files and a report")->required();
+    calibration->callback([&] { Train::calibrate(scores, algorithm, folder); });
     try {
         CLI11_PARSE(app, argc, argv);
     } catch (const std::exception& e) {

@@ -122,6 +122,11 @@ std::vector<double> damped(const std::vector<float>& lower, std::size_t samples)
     return result;
 }
 
+void spreadScores(TrainedSvm& svm, double threshold, double gain) {
+    for (float& alpha : svm.alphas) alpha = static_cast<float>(alpha * gain);
+    svm.bias = static_cast<float>(gain * (svm.bias + threshold) - threshold);
+}
+
 CascadeSettings settingsOf(const std::string& file, const std::vector<WorkingStep>& steps) {
     CascadeSettings settings{file, {}};
     for (const WorkingStep& step : steps)

@@ -22,8 +22,11 @@ struct WorkingStep {
 void setWorkingPoint(Eye::Implementation::TrainedSvm& svm, const std::vector<Signs>& faces,
                      const std::vector<WorkingStep>& steps);
 
-/// The same for a machine of degree 2, whose earlier steps can be met exactly: alphas between two steps take
-/// up a change that moves the scores of all `windows` alike, as nearly as there is one.
+/// Multiplies the distance of all scores from a threshold; what passes there stays the same.
+void spreadScores(Eye::Implementation::TrainedSvm& svm, double threshold, double gain);
+
+/// As setWorkingPoint, for a machine of degree 2, whose earlier steps can be met exactly: alphas between two
+/// steps take up a change that moves the scores of all `windows` alike, as nearly as there is one.
 void setWorkingPoints(Eye::Implementation::TrainedSvm& svm, const std::vector<Signs>& faces,
                       const std::vector<WorkingStep>& steps, const std::vector<Signs>& windows);
 

@@ -81,7 +81,11 @@ std::vector<unsigned char> acceptedWindows(const SodDotDiscriminator& discrimina
     const std::size_t counted = std::min(countedVectors, tables.alphas.size());
     std::array<std::vector<std::uint16_t>, countedVectors> counts;
     counts.fill(std::vector<std::uint16_t>(h + SodImage::readableBehind));
-    std::vector<unsigned char> accepted(w * h);
+    std::vector<unsigned char> accepted(w * h, 0);
+    // Most windows end here: a product below the threshold is a count above this one.
+    const int mostDiffering = tables.firstStepShortcut
+                                  ? (static_cast<int>(tables.dimension) - tables.firstStepThreshold) / 2
+                                  : static_cast<int>(tables.dimension);
     Fn::SignValueVector<int> window(SodImage::windowBits);
     const auto count = [](auto... args) { HWY_DYNAMIC_DISPATCH(countDifferingBits)(args...); };
     const auto vector = [&](std::size_t j) { return tables.vectors.data() + j * tables.stride; };
@@ -89,6 +93,7 @@ std::vector<unsigned char> acceptedWindows(const SodDotDiscriminator& discrimina
         for (std::size_t j = 0; j < counted; ++j)
             count(sods.column(x), sods.stride(), h, vector(j), counts[j].data());
         for (std::uint32_t y = 0; y < h; ++y) {
+            if (counts[0][y] > mostDiffering) continue;
             const auto differingBits = [&](std::uint32_t j) -> std::uint32_t {
                 if (j < counted) return counts[j][y];
                 sods.getWindow(x, y, window.exclusiveBytes());

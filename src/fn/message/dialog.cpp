@@ -4,6 +4,7 @@
 
 #include <iostream>
 #include <mutex>
+#include <type_traits>
 
 namespace {
 
@@ -13,7 +14,8 @@ void writeLine(std::ostream& stream, const char* kind, const std::string& messag
     stream << "[" + Fn::TimeStamp::now().localAsString() + "]" + kind + message << std::endl;
 }
 
-std::mutex& sinkMutex = *new std::mutex;
+constinit std::mutex sinkMutex; // nothing of it is destroyed at the end of the process
+static_assert(std::is_trivially_destructible_v<std::mutex>);
 
 FNCountedPtr<FNDialog::Body>& sink() {
     static auto& current = *new FNCountedPtr<FNDialog::Body>;

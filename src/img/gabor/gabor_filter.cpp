@@ -2,6 +2,7 @@
 
 #include <cmath>
 #include <numbers>
+#include <vector>
 
 namespace Img {
 
@@ -25,6 +26,39 @@ void gaborInFourier(double sigma, FN2Vector<double> k, FNImage<FNComplex<float>>
                 }
             *out++ = {static_cast<float>(2 * pi * sum), 0};
         }
+}
+
+namespace {
+
+/// The used indexes as two ranges at most, which leave out the longest stretch between them.
+PixelBlockRanges rangesOf(const std::vector<bool>& used) {
+    std::uint32_t begin = 0, end = 0, gapBegin = 0, gapEnd = 0;
+    for (std::uint32_t i = 0; i < used.size(); ++i) {
+        if (!used[i]) continue;
+        if (end == 0)
+            begin = i;
+        else if (i - end > gapEnd - gapBegin) {
+            gapBegin = end;
+            gapEnd = i;
+        }
+        end = i + 1;
+    }
+    return gapEnd == 0 ? PixelBlockRanges{begin, end} : PixelBlockRanges{begin, gapBegin, gapEnd, end};
+}
+
+} // namespace
+
+SparseImage<float> pruneGaborImage(const FNImage<FNComplex<float>>& filter, float threshold) {
+    std::vector<bool> columns(filter.w()), rows(filter.h());
+    FNImage<float> kept(filter.w(), filter.h());
+    float* out = kept.getExclusive();
+    for (std::uint32_t y = 0; y < filter.h(); ++y)
+        for (std::uint32_t x = 0; x < filter.w(); ++x, ++out) {
+            const float value = filter(x, y).re;
+            *out = std::abs(value) >= threshold ? value : 0.0f;
+            if (*out != 0) columns[x] = rows[y] = true;
+        }
+    return SparseImage<float>(kept, rangesOf(columns), rangesOf(rows));
 }
 
 } // namespace Img

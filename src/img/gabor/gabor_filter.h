@@ -3,6 +3,7 @@
 #include "fn/complex.h"
 #include "fn/geometry.h"
 #include "fn/image.h"
+#include "fn/sparse_image.h"
 
 namespace Img {
 
@@ -19,5 +20,9 @@ namespace Img {
 /// @param k wave vector in radians per pixel, not zero
 /// @param eps a term counts as 0 if it is not above eps / (w * h)
 void gaborInFourier(double sigma, FN2Vector<double> k, FNImage<FNComplex<float>>& image, double eps);
+
+/// The real parts that are not 0 and not below `threshold` in magnitude, on the blocks of columns and rows
+/// that hold any.
+SparseImage<float> pruneGaborImage(const FNImage<FNComplex<float>>& filter, float threshold);
 
 } // namespace Img

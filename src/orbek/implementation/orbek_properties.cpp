@@ -69,8 +69,8 @@ std::list<Property> members() {
         pending("FeatureTest", "Kx::Feature::Test", "Portrait feature assessment"),
         pending("CropFullFrontal", "CropToFullFrontal", "ISO 19794-5 Full Frontal images cropping"),
         pending("CropTokenImage", "CropToTokenImage", "ISO 19794-5 Token images cropping"),
-        pending("FgDllCache", "FG::DllFrameGrabberFactoryCacheDef",
-                "Definition of DLL load paths for capture devices"),
+        property<FG::DllFrameGrabberFactoryCacheDef>::create(
+            "FgDllCache", "Definition of DLL load paths for capture devices"),
         property<Container<FG::FrameGrabberFactoryDef>>::create("CaptureDevices",
                                                                 "Configuration of capture devices"),
         property<Container<CamControl>>::create(
