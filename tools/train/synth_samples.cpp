@@ -249,13 +249,15 @@ SynthSample PhotoWarper::sample(const Planes& planes) const {
 }
 
 std::vector<float> PhotoWarper::patch(const PointedFace& face) const {
-    constexpr std::uint32_t factor = 4;
+    // From the brows to the chin, between the cheeks: hair and background are outside.
+    constexpr FNPos corner{-0.95f, 0.55f}, opposite{0.95f, -1.65f};
+    constexpr std::uint32_t w = 30, h = 35;
     const Planes planes = aligned(face);
-    constexpr auto edge = static_cast<std::int32_t>(border);
-    FNImage<float> small(frame_.w() / factor, frame_.h() / factor);
-    Img::Affine::transform(planes.y, small,
-                           {edge, edge, edge + static_cast<std::int32_t>(frame_.w()),
-                            edge + static_cast<std::int32_t>(frame_.h())});
+    const Synth::HeadAxes head(std::span<const FNPos>(frame_.mesh()).first(landmarkCount));
+    const FNGridPos first(head.picture(corner) + FNPos{border, border});
+    const FNGridPos last(head.picture(opposite) + FNPos{border, border});
+    FNImage<float> small(w, h);
+    Img::Affine::transform(planes.y, small, {first.x, first.y, last.x, last.y});
     return {small.data(), small.data() + small.size()};
 }
 

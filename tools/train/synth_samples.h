@@ -55,7 +55,7 @@ public:
 
     /// The face as it is, and in a mirror.
     std::pair<SynthSample, SynthSample> samples(const PointedFace& face) const;
-    /// The brightness of the face, only brought upright and to a size, at a quarter of the resolution.
+    /// The brightness from brows to chin, only brought upright and to a size of 30 by 35 pixels.
     std::vector<float> patch(const PointedFace& face) const;
 
 private:
