@@ -3,6 +3,8 @@
 #include "fg/capture_types.h"
 #include "fg/dll_objects.h"
 
+#include <algorithm>
+
 namespace FG {
 
 using Fn::Deployment::Component;
@@ -21,7 +23,13 @@ GrabberPair DllFrameGrabberFactory::createFG2(const Component& settings, const s
     return {keepLoaded(dll_, made.first), keepLoaded(dll_, made.second)};
 }
 
+bool DllFrameGrabberFactoryCache::has(const std::string& kind) const {
+    const std::list<Component> paths = component_.subComponent("DllPaths").subComponents();
+    return std::ranges::any_of(paths, [&](const Component& path) { return path.ownType().name() == kind; });
+}
+
 DllFrameGrabberFactory DllFrameGrabberFactoryCache::get(const std::string& kind) {
+    const FNMutexLock lock(mutex_);
     const auto known = factories_.find(kind);
     if (known != factories_.end()) return known->second;
     std::string names;
