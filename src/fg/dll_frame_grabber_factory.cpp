@@ -3,8 +3,6 @@
 #include "fg/capture_types.h"
 #include "fg/dll_objects.h"
 
-#include <algorithm>
-
 namespace FG {
 
 using Fn::Deployment::Component;
@@ -23,9 +21,15 @@ GrabberPair DllFrameGrabberFactory::createFG2(const Component& settings, const s
     return {keepLoaded(dll_, made.first), keepLoaded(dll_, made.second)};
 }
 
+GrabberPair DllFrameGrabberFactory::createBoth(const Component& settings, const std::string& name) const {
+    if (dll_.exports("createFG2")) return createFG2(settings, name);
+    const FNCountedPtr<Fn::LiveVideoSource> source = createFG(settings, name);
+    if (!source) return {};
+    return {source, FNCountedPtr<StillImageSource>(new StillImageSourceEmulator(source))};
+}
+
 bool DllFrameGrabberFactoryCache::has(const std::string& kind) const {
-    const std::list<Component> paths = component_.subComponent("DllPaths").subComponents();
-    return std::ranges::any_of(paths, [&](const Component& path) { return path.ownType().name() == kind; });
+    return Fn::Deployment::listsElement(component_.subComponent("DllPaths"), kind);
 }
 
 DllFrameGrabberFactory DllFrameGrabberFactoryCache::get(const std::string& kind) {

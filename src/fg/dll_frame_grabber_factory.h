@@ -37,6 +37,8 @@ public:
                                                const std::string& name) const;
     /// Either handle may be null. @throws FNESysError if the library has no "createFG2"
     GrabberPair createFG2(const Fn::Deployment::Component& settings, const std::string& name) const;
+    /// As createFG2(); the single pictures of a library that knows only "createFG" are those of its video.
+    GrabberPair createBoth(const Fn::Deployment::Component& settings, const std::string& name) const;
 
 private:
     Fn::Dll dll_;

@@ -1,11 +1,10 @@
 #include "orbek/capture_device.h"
 
 #include "fg/frame_grabber_factory.h"
+#include "fn/deployment/composite_values.h"
 #include "orbek/implementation/capture_device_impl.h"
 #include "orbek/implementation/configuration_implementation.h"
 #include "orbek/implementation/video_format_body.h"
-
-#include <algorithm>
 
 namespace Orbek {
 
@@ -20,7 +19,7 @@ FG::GrabberPair makeGrabber(const Component& device, const std::string& name,
         FG::FrameGrabberFactory<FG::FrameGrabberFullSet>::create2(device, name, plugins);
     const std::string kind = device.read(true);
     if (made.first || made.second || !plugins.has(kind)) return made;
-    return plugins.get(kind).createFG2(device.subComponent(kind), name);
+    return plugins.get(kind).createBoth(device.subComponent(kind), name);
 }
 
 } // namespace
@@ -62,9 +61,7 @@ CaptureDevice createCaptureDevice(const Configuration& configuration, const std:
     const Component device = root.subComponent("CaptureDevices").subComponent(name);
     const auto plugins = implementation->resources().dllFrameGrabberFactoryCache();
     const FG::GrabberPair grabber = makeGrabber(device, name, *plugins);
-    const std::list<Component> controllers = root.subComponent("CameraControllers").subComponents();
-    const bool controlled =
-        std::ranges::any_of(controllers, [&](const Component& c) { return c.ownType().name() == name; });
+    const bool controlled = listsElement(root.subComponent("CameraControllers"), name);
     return CaptureDevice(new CaptureDeviceImpl(device.name(), grabber, controlled));
 }
 

@@ -89,6 +89,10 @@ TEST(CaptureDevice, LivesInAPlugInWhereOneIsConfigured) {
     const std::string settings = "ORBEK.CaptureDevices = gate\nORBEK.CaptureDevices.gate = Basler\n"
                                  "ORBEK.FgDllCache.DllPaths = Basler\nORBEK.FgDllCache.DllPaths.Basler = ";
     Image image;
+    EXPECT_EQ(
+        createCaptureDevice(configured(settings + FG_PLUGIN_video_only + "\n"), "gate")->release()->width(),
+        4u)
+        << "a plug-in may know video only";
     {
         const Configuration configuration = configured(settings + FG_PLUGIN_whole + "\n");
         const CaptureDevice device = createCaptureDevice(configuration, "gate");
