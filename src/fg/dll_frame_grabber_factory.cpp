@@ -21,7 +21,19 @@ GrabberPair DllFrameGrabberFactory::createFG2(const Component& settings, const s
     return {keepLoaded(dll_, made.first), keepLoaded(dll_, made.second)};
 }
 
+GrabberPair DllFrameGrabberFactory::createBoth(const Component& settings, const std::string& name) const {
+    if (dll_.exports("createFG2")) return createFG2(settings, name);
+    const FNCountedPtr<Fn::LiveVideoSource> source = createFG(settings, name);
+    if (!source) return {};
+    return {source, FNCountedPtr<StillImageSource>(new StillImageSourceEmulator(source))};
+}
+
+bool DllFrameGrabberFactoryCache::has(const std::string& kind) const {
+    return Fn::Deployment::listsElement(component_.subComponent("DllPaths"), kind);
+}
+
 DllFrameGrabberFactory DllFrameGrabberFactoryCache::get(const std::string& kind) {
+    const FNMutexLock lock(mutex_);
     const auto known = factories_.find(kind);
     if (known != factories_.end()) return known->second;
     std::string names;

@@ -3,6 +3,7 @@
 #include "fg/still_image_source.h"
 #include "fn/deployment/component.h"
 #include "fn/dll.h"
+#include "fn/thread/mutex.h"
 
 #include <map>
 #include <utility>
@@ -36,6 +37,8 @@ public:
                                                const std::string& name) const;
     /// Either handle may be null. @throws FNESysError if the library has no "createFG2"
     GrabberPair createFG2(const Fn::Deployment::Component& settings, const std::string& name) const;
+    /// As createFG2(); the single pictures of a library that knows only "createFG" are those of its video.
+    GrabberPair createBoth(const Fn::Deployment::Component& settings, const std::string& name) const;
 
 private:
     Fn::Dll dll_;
@@ -43,18 +46,21 @@ private:
     mutable CreateFG2* createFG2_ = nullptr; ///< from the first use on
 };
 
-/// The plug-ins of a configuration by kind, each loaded at the first request.
+/// The plug-ins of a configuration by kind, each loaded at the first request. May be used by several threads.
 class DllFrameGrabberFactoryCache {
 public:
     /// @param component of type DllFrameGrabberFactoryCacheDef
     explicit DllFrameGrabberFactoryCache(const Fn::Deployment::Component& component)
         : component_(component) {}
 
+    /// Whether a path is configured for the kind.
+    bool has(const std::string& kind) const;
     /// @throws FNEBadArg if no path is configured for the kind; FNESysError if the library cannot be used
     DllFrameGrabberFactory get(const std::string& kind);
 
 private:
     Fn::Deployment::Component component_;
+    FNMutex mutex_{FNMutex::recursive}; ///< guards the map
     std::map<std::string, DllFrameGrabberFactory> factories_;
 };
 

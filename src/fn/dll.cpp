@@ -25,12 +25,20 @@ void* Dll::Library::symbol(const std::string& name) const {
     return address;
 }
 
+bool Dll::Library::exports(const std::string& name) const {
+    return dlsym(handle_, name.c_str()) != nullptr;
+}
+
 Dll::Dll(const std::string& path) : library_(new Library(path)) {}
 
 void* Dll::symbol(const std::string& name) const {
     if (!library_)
         FN_THROW(FNESysError, "Symbolic name can not be resolved: " + name + " (library not loaded)");
     return library_->symbol(name);
+}
+
+bool Dll::exports(const std::string& name) const {
+    return library_ && library_->exports(name);
 }
 
 } // namespace Fn

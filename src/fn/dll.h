@@ -20,6 +20,8 @@ public:
     }
     /// @throws FNESysError
     void* symbol(const std::string& name) const;
+    /// Whether there is a library that exports the name.
+    bool exports(const std::string& name) const;
 
 private:
     class Library {
@@ -29,6 +31,7 @@ private:
         Library(const Library&) = delete;
         Library& operator=(const Library&) = delete;
         void* symbol(const std::string& name) const;
+        bool exports(const std::string& name) const;
 
     private:
         void* handle_;

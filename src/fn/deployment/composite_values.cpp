@@ -90,6 +90,12 @@ const std::list<Property>& membersOf(const Type& type) {
     return isAlternative(type) ? delegateType(type).properties() : type.properties();
 }
 
+bool listsElement(const Component& node, const std::string& name) {
+    if (!isContainer(node.type())) return false;
+    const std::list<std::string> names = ContainerBase::stringToValue(node.read(false));
+    return std::find(names.begin(), names.end(), name) != names.end();
+}
+
 std::list<std::string> getAllValues(const Type& type) {
     const std::string kind = idPrefix(type);
     if (kind == "Bool") return {Bool::True, Bool::False};

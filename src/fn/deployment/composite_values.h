@@ -1,5 +1,6 @@
 #pragma once
 
+#include "fn/deployment/component.h"
 #include "fn/deployment/leaf_values.h"
 #include "fn/deployment/type.h"
 #include "fn/serialize.h"
@@ -23,6 +24,8 @@ const Type& delegateType(const Type& alternative);
 /// What can stand below a node: the delegate's properties for an alternative, the type's own for everything
 /// else.
 const std::list<Property>& membersOf(const Type& type);
+/// Whether a node is a container that lists an element of that name.
+bool listsElement(const Component& node, const std::string& name);
 /// The values that a type allows, empty if there is no such list.
 std::list<std::string> getAllValues(const Type& type);
 

@@ -32,4 +32,12 @@ EyesFinder Resources::eyesFinder() const {
     }));
 }
 
+FNCountedPtr<FG::DllFrameGrabberFactoryCache> Resources::dllFrameGrabberFactoryCache() const {
+    const FNMutexLock lock(mutex_);
+    if (!dllFrameGrabberFactoryCache_)
+        dllFrameGrabberFactoryCache_ = FNCountedPtr<FG::DllFrameGrabberFactoryCache>(
+            new FG::DllFrameGrabberFactoryCache(rootComponent_.subComponent("FgDllCache")));
+    return dllFrameGrabberFactoryCache_;
+}
+
 } // namespace Orbek

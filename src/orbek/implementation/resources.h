@@ -2,6 +2,7 @@
 
 #include "eye/eyes_finder.h"
 #include "eye/face_finder.h"
+#include "fg/dll_frame_grabber_factory.h"
 #include "fn/deployment/app_config_db.h"
 #include "fn/deployment/component.h"
 #include "fn/thread/mutex.h"
@@ -43,6 +44,8 @@ public:
     /// @throws FNEGeneric "<engine> : <reason>" if one cannot be made
     FaceFinder faceFinder() const;
     EyesFinder eyesFinder() const;
+    /// The plug-ins of capture devices.
+    FNCountedPtr<FG::DllFrameGrabberFactoryCache> dllFrameGrabberFactoryCache() const;
 
 private:
     /// Held while an engine is made; recursive, since making one engine may ask for another.
@@ -51,6 +54,7 @@ private:
     Fn::Deployment::Component rootComponent_;
     MadeOnce<FaceFinder::Body> faceFinder_;
     MadeOnce<EyesFinder::Body> eyesFinder_;
+    mutable FNCountedPtr<FG::DllFrameGrabberFactoryCache> dllFrameGrabberFactoryCache_;
 };
 
 } // namespace Orbek
