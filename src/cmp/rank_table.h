@@ -7,16 +7,18 @@
 namespace Cmp::Implementation {
 
 /// Turns the rank of a filter response among its neighbours into a number. The table has an element for each
-/// rank in a full neighbourhood, the response itself included; it must outlive this.
+/// rank in a full neighbourhood, the response itself included, and may have one more, for what lies beyond
+/// the last one; it must outlive this.
 class RankTable {
 public:
-    explicit RankTable(std::span<const float> values) : values_(values) {}
+    /// @param full size of a full neighbourhood
+    RankTable(std::span<const float> values, unsigned int full) : values_(values), full_(full) {}
 
     /// @param greater how many of the neighbours exceed the response, below `total`
     /// @param total size of the neighbourhood. The ranks of a smaller one are spread over those of the full.
     float operator()(unsigned int greater, unsigned int total) const {
-        if (total == values_.size()) return values_[greater];
-        const float spread = static_cast<float>(values_.size()) / static_cast<float>(total);
+        if (total == full_) return values_[greater];
+        const float spread = static_cast<float>(full_) / static_cast<float>(total);
         const float pos = spread * (static_cast<float>(greater) + 0.5f);
         const float whole = std::trunc(pos - 0.5f), t = pos - (whole + 0.5f);
         const auto i = static_cast<std::size_t>(whole);
@@ -25,6 +27,7 @@ public:
 
 private:
     std::span<const float> values_;
+    unsigned int full_;
 };
 
 } // namespace Cmp::Implementation

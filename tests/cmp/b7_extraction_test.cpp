@@ -1,10 +1,13 @@
+#include "cmp/b7/preprocessor.h"
 #include "cmp/b7/reshape_warp.h"
 
+#include "support/each_target.h"
 #include "support/thrown.h"
 
 #include <gtest/gtest.h>
 
 #include <cmath>
+#include <random>
 
 namespace {
 
@@ -93,6 +96,65 @@ TEST(ReshapeWarp, RefusesWhatIsNoFace) {
     EXPECT_EQ(thrown({{30, 40}, {30, 40}, {45, 70}, {45, 40}}), noFace);
     EXPECT_EQ(thrown({{30, 40}, {1e9f, 40}, {45, 1e9f}, {45, 40}}), noFace);
     EXPECT_EQ(thrown({{30, 40}, {60, 40}, {NAN, 70}, {45, 40}}), noFace);
+}
+
+/// Noise, or one value, or a dark and a bright half.
+FNImage<float> testFace(const std::string& kind) {
+    std::mt19937 random(7);
+    FNImage<float> image(warpedSize, warpedSize);
+    float* const pixels = image.getExclusive();
+    for (std::uint32_t i = 0; i < image.size(); ++i)
+        pixels[i] = kind == "noise"    ? static_cast<float>(random() % 256) / 255
+                    : kind == "halves" ? static_cast<float>(i % warpedSize < 77)
+                                       : 0.25f;
+    return image;
+}
+
+class B7PreProcessor : public testing::Test {
+protected:
+    static const PreProcessor& processor() {
+        static const PreProcessor instance;
+        return instance;
+    }
+};
+
+TEST_F(B7PreProcessor, RanksTheSameOnAllVectorUnits) {
+    ASSERT_EQ(PreProcessor::computeFeatureVectorSize(), 20604u);
+    for (const std::string kind : {"noise", "flat", "halves"}) {
+        const auto responses = processor().bank().respond(processor().normalize(testFace(kind)));
+        const FNVector<float> plain = processor().extractPlain(responses);
+        forEachTarget([&] { EXPECT_EQ(processor().extract(responses), plain) << kind; });
+    }
+}
+
+TEST_F(B7PreProcessor, FiltersAsFullTransformsDo) {
+    const FNImage<float> face = processor().normalize(testFace("noise"));
+    const auto fast = processor().bank().respond(face), plain = processor().bank().respondPlain(face);
+    for (std::size_t s = 0; s < PreProcessor::NUM_SHAPED_GRIDS; ++s)
+        for (std::size_t o = 0; o < PreProcessor::orientations; ++o) {
+            const FNImage<float>&a = fast.filter(s, o), &b = plain.filter(s, o);
+            ASSERT_EQ(a.size(), b.size());
+            const float greatest = *std::max_element(b.data(), b.data() + b.size());
+            for (std::size_t i = 0; i < a.size(); ++i)
+                ASSERT_NEAR(a.data()[i], b.data()[i], 1e-5f * greatest) << s << " " << o;
+        }
+}
+
+TEST_F(B7PreProcessor, GivesRanksThatDoNotDependOnBrightnessAndContrast) {
+    const FNImage<float> face = testFace("noise");
+    FNImage<float> dim(face.w(), face.h());
+    for (std::size_t i = 0; i < face.size(); ++i) dim.getExclusive()[i] = face.data()[i] * 0.5f;
+    const FNVector<float> a = processor()(face), b = processor()(dim);
+    // Differences near the additive noise are lost in the dim image.
+    EXPECT_GT(a * b / std::sqrt((a * a) * (b * b)), 0.97f);
+    for (const float rank : a) {
+        ASSERT_LE(rank, PreProcessor::rankTable[0]);
+        ASSERT_GE(rank, 0);
+    }
+    // Without any difference, no neighbour is greater: the first rank, or one between it and the next.
+    for (const float rank : processor()(testFace("flat"))) ASSERT_GT(rank, PreProcessor::rankTable[5]);
+    EXPECT_EQ(thrownBy([&] { processor()(FNImage<float>(80, 80)); }),
+              "FNEBadArg: ImgFFT<float,MKL>::transformReal: invalid image sizes");
 }
 
 } // namespace
