@@ -1,12 +1,16 @@
 #include "cmp/b7/preprocessor.h"
 #include "cmp/b7/reshape_warp.h"
+#include "cmp/b7/transformation.h"
 
 #include "support/each_target.h"
+#include "support/scratch_folder.h"
 #include "support/thrown.h"
 
+#include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
 #include <cmath>
+#include <functional>
 #include <random>
 
 namespace {
@@ -155,6 +159,103 @@ TEST_F(B7PreProcessor, GivesRanksThatDoNotDependOnBrightnessAndContrast) {
     for (const float rank : processor()(testFace("flat"))) ASSERT_GT(rank, PreProcessor::rankTable[5]);
     EXPECT_EQ(thrownBy([&] { processor()(FNImage<float>(80, 80)); }),
               "FNEBadArg: ImgFFT<float,MKL>::transformReal: invalid image sizes");
+}
+
+using Weights = Fn::Matrix<signed char>;
+
+template <class Next> Weights weights(std::size_t rows, std::size_t cols, Next next) {
+    Weights m(rows, cols);
+    std::generate_n(m.getExclusive(), m.size(), next);
+    return m;
+}
+
+TEST(MultiplyDigitized, SumsExactlyOnAllVectorUnits) {
+    std::mt19937 random(3);
+    const auto noise = [&] { return static_cast<signed char>(random()); };
+    struct Case {
+        std::size_t rows;
+        std::function<signed char()> weight;
+        std::function<short()> digit;
+    };
+    // Sums beyond 32 bits keep the lower ones.
+    const Case cases[] = {
+        {1, noise, [&] { return static_cast<short>(random()); }},
+        {77, noise, [&] { return static_cast<short>(random()); }},
+        {20608, noise, [&] { return static_cast<short>(random()); }},
+        {20608, [] { return static_cast<signed char>(-128); }, [] { return short{-32768}; }},
+        {20608, [] { return static_cast<signed char>(127); }, [] { return short{-32767}; }}};
+    for (const Case& c : cases) {
+        const Weights m = weights(c.rows, 3, c.weight);
+        FNVector<short> v(c.rows);
+        std::generate_n(v.getExclusive(), v.size(), c.digit);
+        forEachTarget([&] {
+            const FNVector<int> products = Cmp::FPMatVecMultiplier().leftMultiply(v, m);
+            for (std::size_t col = 0; col < 3; ++col) {
+                std::int64_t sum = 0;
+                for (std::size_t row = 0; row < c.rows; ++row) sum += int{m(row, col)} * int{v[row]};
+                ASSERT_EQ(products[col], static_cast<int>(sum)) << c.rows;
+            }
+        });
+    }
+}
+
+TEST(MultiplyDigitized, DigitizesBetweenTheLeastAndTheGreatestElement) {
+    const Cmp::DigitizedVector d(FNVector<float>(std::vector{-32766.0f, 1.5f, 0.5f, 1.25f, 32768.0f}), 6);
+    EXPECT_EQ(std::vector<short>(d.digits.begin(), d.digits.end()),
+              (std::vector<short>{-32767, 1, -1, 0, 32767, 0}));
+    EXPECT_EQ(d.offset, 1);
+
+    const Weights m = weights(4, 1, [i = 0]() mutable { return static_cast<signed char>(10 * ++i); });
+    const FNVector<float> base(1, 6 * 0.5f); // of the first three weights 10, 20, 30 with factor 0.05
+    const auto product = [&](std::vector<float> v) {
+        return Cmp::multiplyDigitized(FNVector<float>(v), m, 0.05f, base)[0];
+    };
+    EXPECT_NEAR(product({1, -2, 0.5f}), 0.05f * (10 - 40 + 15), 1e-3);
+    EXPECT_NEAR(product({7, 7, 7}), 7 * 3, 1e-6) << "a constant vector";
+    EXPECT_EQ(thrownBy([&] { product({1, 2, 3, 4, 5}); }), "FNEBadArg: Invalid Size for digitized vector");
+}
+
+TEST(B7Transformation, ComesBackFromItsFile) {
+    std::mt19937 random(3);
+    const auto vector = [&](std::size_t n) {
+        FNVector<float> v(n);
+        std::generate_n(v.getExclusive(), n, [&] { return static_cast<float>(random() % 100) / 50 - 1; });
+        return v;
+    };
+    const ScratchFolder folder;
+    const std::string path = folder.file("trans");
+    Transformation{0.25f, weights(21, 5, [&] { return static_cast<signed char>(random()); }), vector(21),
+                   vector(5), vector(5)}
+        .write(path);
+    const Transformation read = Transformation::read(path, 21, 5);
+    EXPECT_EQ(read.matrix.rows(), 32u);
+    EXPECT_EQ(read.matrix(31, 4), 0);
+    EXPECT_EQ(read(read.average), read.translation) << "nothing is left of the average";
+    const std::string content = folder.read("trans");
+    read.write(path);
+    EXPECT_EQ(folder.read("trans"), content);
+
+    const auto thrown = [&](const std::string& file, std::size_t rows, std::size_t cols) {
+        return thrownBy([&] { Transformation::read(file, rows, cols); });
+    };
+    const std::string invalid = "FNEIOError: CmpAlgorithm: invalid ";
+    EXPECT_EQ(thrown(folder.file("none"), 21, 5), "FNEIOError: CmpAlgorithm: File '" + folder.file("none") +
+                                                      "' could not be opened for reading.");
+    EXPECT_EQ(thrown(path, 22, 5), invalid + "matrix package reading file '" + path + "'");
+    EXPECT_EQ(thrown(path, 21, 6), "FNEIOError: PCLD: incompatible number of vector components.  Matrix cols "
+                                   "= 5 EncodedFeature components = 6\n");
+    const struct {
+        std::size_t size;
+        const char* text;
+    } cuts[] = {{0, "float factor package reading file '"},
+                {40, "matrix package reading file '"},
+                {content.size() - 150, "average vector package "},
+                {content.size() - 50, "translation vector package "},
+                {content.size() - 1, "transformed gabor base vector package "}};
+    for (const auto& cut : cuts) {
+        const std::string file = folder.write("cut", content.substr(0, cut.size));
+        EXPECT_THAT(thrown(file, 21, 5), testing::StartsWith(invalid + cut.text + file));
+    }
 }
 
 } // namespace
