@@ -6,6 +6,7 @@
 #include "train/face_training.h"
 #include "train/feature_training.h"
 #include "train/l5_training.h"
+#include "train/synth_training.h"
 
 #include <CLI/CLI.hpp>
 
@@ -36,6 +37,17 @@ int main(int argc, char** argv) {
     training("eyes", "The file of the eyes finder", Train::trainEyesFinder);
     training("mouth", "The file of the mouth finder", Train::trainMouthFinder);
     training("bridge", "The file of the nose bridge finder", Train::trainBridgeFinder);
+    training("synth", "The model of sample people who do not exist", Train::trainSynth);
+    std::string samples;
+    CLI::App* const measure = app.add_subcommand(
+        "measure-synth", "How far sample portraits are from the photos that their model learned from");
+    measure->add_option("--data", data, "Root of the labelled images")
+        ->required()
+        ->check(CLI::ExistingDirectory);
+    measure->add_option("--samples", samples, "Label file of the portraits")
+        ->required()
+        ->check(CLI::ExistingFile);
+    measure->callback([&] { Train::measureSynth(data, samples); });
     training("l5", "The transformation and the mapping files of the L5 comparison", Train::trainL5);
     std::string scores, algorithm;
     CLI::App* const calibration = app.add_subcommand(
