@@ -1,9 +1,12 @@
 #include "img/contrast.h"
 #include "img/fft/frequency_grid.h"
 #include "img/local_filters.h"
+#include "img/support_norm.h"
 #include "img/whitening_filter.h"
 
 #include "random_images.h"
+#include "support/each_target.h"
+#include "support/thrown.h"
 
 #include <gtest/gtest.h>
 
@@ -186,6 +189,40 @@ TEST(LocalFilters, GrayHistogramCountsValues) {
     EXPECT_EQ(std::count(image.data(), image.data() + image.size(), 255), all[255]);
     EXPECT_EQ(std::accumulate(all.begin(), all.end(), 0), 31 * 9);
     EXPECT_EQ(std::accumulate(left.begin(), left.end(), 0), 10 * 9);
+}
+
+TEST(SupportNorm, GivesTheSameBitsOnAllVectorUnits) {
+    RandomImages random(5);
+    const Img::SupportNorm norm(4.0f, 6, 0.007f, 1.007f);
+    for (const FNGridPos size : {FNGridPos{1, 1}, {5, 3}, {13, 40}, {33, 14}, {160, 20}}) {
+        FNImage<float> image = random.image<float>(size.x, size.y);
+        float* const pixels = image.getExclusive();
+        for (std::size_t i = 0; i < image.size(); i += 7)
+            pixels[i] = std::array{0.0f, -3.0f, 1e30f, INFINITY, NAN, 0.5f}[i % 6];
+        const FNImage<float> plain = norm.plain(image);
+        forEachTarget([&] {
+            const FNImage<float> fast = norm(image);
+            for (std::size_t i = 0; i < image.size(); ++i)
+                ASSERT_EQ(fast.data()[i], plain.data()[i]) << size.x << " by " << size.y << " at " << i;
+        });
+    }
+}
+
+TEST(SupportNorm, WeighsDarkerAgainstBrighterNeighboursBeyondTheNoise) {
+    const Img::SupportNorm norm(2.0f, 1, 0.01f, 1.1f);
+    FNImage<float> image(3, 3);
+    image.fill(0.5f);
+    EXPECT_EQ(norm(image)(1, 1), 0);
+    float* const pixels = image.getExclusive();
+    const float side = std::exp(-1 / 4.0f), corner = std::exp(-2 / 4.0f), sum = 4 * side + 4 * corner;
+    pixels[0] = 0.4f;  // darker: below 0.5 / 1.1 - 0.01
+    pixels[1] = 0.57f; // brighter: above 0.5 * 1.1 + 0.01
+    pixels[2] = 0.55f; // neither
+    EXPECT_NEAR(norm(image)(1, 1), (corner - side) / sum, 1e-6);
+    EXPECT_NEAR(norm(image)(0, 0), -1, 1e-6) << "the window is cut to the image";
+    EXPECT_EQ(thrownBy([] { Img::SupportNorm(1, 1, 0, 0.99f); }),
+              "FNEGeneric: Multiplicative noise threshold parameter must be >=1!");
+    EXPECT_EQ(thrownBy([] { Img::SupportNorm(0, 1, 0, 1); }), "FNEGeneric: Sigma must be positive!");
 }
 
 } // namespace

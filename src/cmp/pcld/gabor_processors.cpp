@@ -41,20 +41,10 @@ FNVector<float> GaborPyrProcessor::operator()(const FNImage<float>& image) const
 }
 
 GaborPyrRankNormProcessor::GaborPyrRankNormProcessor(const Params& params)
-    : pyramid_(pyramidParams(params)), rankTable_(params.rankTable) {
+    : pyramid_(pyramidParams(params)), rankTable_({params.rankTable, rankTableSize}, rankTableSize) {
     for (const unsigned int radius : {params.scaleRadius, params.angleRadius, params.xRadius, params.yRadius})
         if (radius != 1) FN_THROW(FNEBadArg, "Gabor pyramid: invalid parameters");
     if (params.angles < 3) FN_THROW(FNEBadArg, "Gabor pyramid: invalid parameters");
-}
-
-float GaborPyrRankNormProcessor::rankValue(unsigned int greater, unsigned int total) const {
-    if (total == rankTableSize) return rankTable_[greater];
-    // A smaller neighbourhood: its ranks spread over those of the full one.
-    const float spread = static_cast<float>(rankTableSize) / static_cast<float>(total);
-    const float pos = spread * (static_cast<float>(greater) + 0.5f);
-    const float whole = std::trunc(pos - 0.5f), t = pos - (whole + 0.5f);
-    const auto i = static_cast<std::size_t>(whole);
-    return (1 - t) * rankTable_[i] + t * rankTable_[std::min(i + 1, rankTableSize - 1)];
 }
 
 FNVector<float> GaborPyrRankNormProcessor::operator()(const FNImage<float>& image) const {
@@ -75,7 +65,7 @@ FNVector<float> GaborPyrRankNormProcessor::operator()(const FNImage<float>& imag
                         ++total;
                         greater += responses(s2, a2, x2, y2) > value; // the value itself is not
                     }
-        *out++ = rankValue(greater, total);
+        *out++ = rankTable_(greater, total);
     });
     return features;
 }

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "cmp/pcld/gabor_pyramid.h"
+#include "cmp/rank_table.h"
 
 namespace Cmp::Pcld {
 
@@ -51,10 +52,8 @@ public:
     std::size_t featureSize() const { return pyramid_.featureSize(); }
 
 private:
-    float rankValue(unsigned int greater, unsigned int total) const;
-
     GaborPyramid pyramid_;
-    const float* rankTable_;
+    Implementation::RankTable rankTable_;
 };
 
 } // namespace Cmp::Pcld

@@ -1,8 +1,7 @@
 #pragma once
 
-#include "fn/sparse_image.h"
+#include "cmp/gabor_bank.h"
 #include "fn/vector.h"
-#include "img/fft/img_fft.h"
 
 #include <vector>
 
@@ -37,29 +36,13 @@ public:
         Axis x, y;
     };
 
-    /// Squared magnitudes of all filters' responses to one image. Only columns that a grid uses are there.
-    class Responses {
-    public:
-        /// @param scale,angle of the filter @param x,y image pixels, a place of any grid
-        float operator()(std::size_t scale, std::size_t angle, unsigned int x, unsigned int y) const {
-            return filters_[scale * angles_ + angle].row(y)[columnIndex_[x]];
-        }
-
-    private:
-        friend class GaborPyramid;
-        explicit Responses(const std::vector<unsigned int>& columnIndex, unsigned int angles)
-            : columnIndex_(columnIndex), angles_(angles) {}
-
-        const std::vector<unsigned int>& columnIndex_;
-        unsigned int angles_;
-        std::vector<FNImage<float>> filters_;
-    };
+    using Responses = Implementation::GaborBank::Responses;
 
     /// @throws FNEBadArg for parameters without any filter, scales above 40 or a size that has no transform
     explicit GaborPyramid(const GaborPyramidParams& params);
 
     /// @throws FNEBadArg for an image of another size
-    Responses respond(const FNImage<float>& image) const;
+    Responses respond(const FNImage<float>& image) const { return bank_.respond(image); }
 
     const GaborPyramidParams& params() const { return params_; }
     /// By scale from the first one.
@@ -76,15 +59,9 @@ public:
     }
 
 private:
-    void makeGrids();
-    void makeFilters();
-
     GaborPyramidParams params_;
-    ImgFFTFloat fft_;
     std::vector<Grid> grids_;
-    std::vector<SparseImage<float>> filters_;
-    std::vector<std::uint32_t> columns_;    ///< that any grid uses, ascending
-    std::vector<unsigned int> columnIndex_; ///< of each image column among them
+    Implementation::GaborBank bank_;
 };
 
 } // namespace Cmp::Pcld

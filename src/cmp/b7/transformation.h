@@ -1,0 +1,32 @@
+#pragma once
+
+#include "cmp/multiply_digitized.h"
+
+#include <string>
+
+namespace Cmp::B7 {
+
+/// The trained projection from raw vectors to features: about (raw - average) * (matrix * factor) +
+/// translation. Its file holds the factor, the matrix and the vectors as packages, one behind the other.
+struct Transformation {
+    float factor;
+    /// A row for each raw component and rows of 0 up to a multiple of 16, a column for each component of a
+    /// feature.
+    Fn::Matrix<signed char> matrix;
+    FNVector<float> average;     ///< of the raw vectors
+    FNVector<float> translation; ///< added to features
+    FNVector<float> base;        ///< of multiplyDigitized()
+
+    /// @throws FNEBadArg for a vector of another size
+    FNVector<float> operator()(FNVector<float> const& raw) const {
+        return multiplyDigitized(raw - average, matrix, factor, base) + translation;
+    }
+
+    /// @param rawSize of raw vectors @param components of features
+    /// @throws FNEIOError if the file cannot be opened or does not hold what it should
+    static Transformation read(const std::string& path, std::size_t rawSize, std::size_t components);
+    /// Without the rows that fill up the matrix. @throws FNEIOError
+    void write(const std::string& path) const;
+};
+
+} // namespace Cmp::B7
