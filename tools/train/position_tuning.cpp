@@ -1,8 +1,6 @@
 #include "train/position_tuning.h"
 
-#include "fn/exception.h"
 #include "fn/numeric/blas.h"
-#include "fn/numeric/lapack.h"
 #include "train/discriminator_training.h"
 
 #include <algorithm>
@@ -18,14 +16,6 @@ using Eye::Implementation::TrainedSvm;
 
 /// So many windows of a search are kept; the finders look at the ten best.
 constexpr std::size_t mostWindows = 40, mostWeighted = 10;
-
-/// x in a * x = b for a symmetric `a`.
-std::vector<double> solved(std::vector<double> a, std::vector<double> b) {
-    std::vector<int> pivots(b.size());
-    if (Fn::Numeric::Lapack<double>::gesv(b.size(), 1, a.data(), pivots.data(), b.data()) != 0)
-        FN_THROW(FNEBadArg, "The responses of a machine depend on each other");
-    return b;
-}
 
 } // namespace
 

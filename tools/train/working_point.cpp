@@ -37,11 +37,15 @@ float response(const TrainedSvm& svm, const Signs& window, std::size_t vector) {
     return value * value;
 }
 
-std::vector<double> evenRaise(const std::vector<double>& covariance, const std::vector<double>& mean) {
-    std::vector<double> a = covariance, raise = mean;
-    std::vector<int> pivots(mean.size());
-    if (Fn::Numeric::Lapack<double>::gesv(mean.size(), 1, a.data(), pivots.data(), raise.data()) != 0)
+std::vector<double> solved(std::vector<double> a, std::vector<double> b) {
+    std::vector<int> pivots(b.size());
+    if (Fn::Numeric::Lapack<double>::gesv(b.size(), 1, a.data(), pivots.data(), b.data()) != 0)
         FN_THROW(FNEBadArg, "The responses of a machine depend on each other");
+    return b;
+}
+
+std::vector<double> evenRaise(const std::vector<double>& covariance, const std::vector<double>& mean) {
+    std::vector<double> raise = solved(covariance, mean);
     const double gain = std::inner_product(mean.begin(), mean.end(), raise.begin(), 0.0);
     for (double& value : raise) value /= gain;
     return raise;

@@ -36,6 +36,8 @@ std::vector<double> reachedSums(const Eye::Implementation::TrainedSvm& svm, cons
 
 /// A covariance from the lower triangle of a sum of squares, damped so that it can be inverted.
 std::vector<double> damped(const std::vector<float>& lower, std::size_t samples);
+/// x in a * x = b, `a` n by n in full, for what machines respond. @throws FNEBadArg if `a` is singular
+std::vector<double> solved(std::vector<double> a, std::vector<double> b);
 /// The change of weights that raises what they weight by 1 in the mean and changes it least from one to
 /// another. @param covariance of what is weighted, n by n, positive definite @param mean n values
 std::vector<double> evenRaise(const std::vector<double>& covariance, const std::vector<double>& mean);
