@@ -53,7 +53,7 @@ void unpackFeature(const RecordForm& form, const Fn::Package& package, unsigned 
     const auto words = reader.next<Words>();
     reader.expectEnd();
     if (words.size() != form.words)
-        FN_THROW(FNEBadArg, form.module + ": loadFeatureSet: incompatible data: feature of " +
+        FN_THROW(FNEBadArg, form.module + ": loadFeatureSet: incompatible data: " + form.label + ": feature of " +
                                 std::to_string(words.size()) + " words instead of " +
                                 std::to_string(form.words));
     if (form.words != 0) std::memcpy(memory, words.get(), form.words * 4);

@@ -1,5 +1,6 @@
 #include "orbek/implementation/orbek_properties.h"
 
+#include "cmp/b7/cmp_algorithm.h"
 #include "eye/cara/face_finder.h"
 #include "eye/ojo/eyes_finder.h"
 #include "eye/tracker/reference_face_tracker.h"
@@ -21,7 +22,7 @@ struct ComparisonAlgorithms {
     static std::string typeId() { return "ComparisonAlgorithms"; }
     static Type define() {
         return Type(typeId(), "Available comparison algorithms",
-                    properties(pending("B7", "Cmp::B7::CmpAlgorithm", "B7 Comparison Algorithm"),
+                    properties(property<Cmp::B7::CmpAlgorithm>::create("B7", "B7 Comparison Algorithm"),
                                pending("B6", "Cmp::B6::CmpAlgorithm", "B6 Comparison Algorithm"),
                                pending("A14", "Cmp::A14::CmpAlgorithm", "A14 Comparison Algorithm"),
                                pending("B6L5", "Cmp::Implementation::B6L5", "B6L5 Comparison Algorithm")),
