@@ -23,13 +23,13 @@ public:
     const Encoder& encoder() const { return *encoder_; }
 
     template <class Feature> FIR encode(const std::vector<Feature>& features) const {
-        StoredFeatures::Block block(features.size() * encoder_->mementoSize());
-        unsigned char* memory = block.getExclusive();
+        StoredFeatures::Block block(new unsigned char[features.size() * encoder_->mementoSize()]);
+        unsigned char* memory = block.get();
         for (const Feature& feature : features) {
             encoder_->encode(feature, memory);
             memory += encoder_->mementoSize();
         }
-        return fir(new Record(form_, block));
+        return fir(new Record(form_, std::move(block), features.size()));
     }
     /// @throws FNEBadArg for a package of another label or form
     FIR read(const Fn::Package& package) const { return fir(new Record(form_, package)); }

@@ -1,7 +1,9 @@
 #include "cmp/b7/cmp_algorithm.h"
 
 #include "cmp/b7/feature_set_builder.h"
-#include "cmp/b7/scoring.h"
+#include "cmp/b7/packed_scoring.h"
+#include "cmp/b7/score_normalization.h"
+#include "cmp/gallery_walk.h"
 #include "eye/boca/mouth_finder.h"
 #include "eye/ojo/eyes_finder.h"
 #include "eye/raiz/bridge_finder.h"
@@ -56,22 +58,28 @@ FIR CmpAlgorithm::merge(const std::list<FIR>& earlier, const FIR& added) const {
 }
 
 float CmpAlgorithm::one2one(const FIR& first, const FIR& second) const {
-    const auto features = [&](const FIR& record) {
-        FixedPointFeatures result;
-        core_->records().decode(record, core_->encoder().createRawFixedType(), result);
-        return result;
-    };
-    return score(features(first), features(second), core_->encoder());
+    const FNCountedPtr<PreparedProbes> probe(new PreparedProbes(core_));
+    probe->add(first);
+    float result;
+    PackedScorer(probe).score(core_->records().record(second), nullptr, {&result, 1});
+    return result;
 }
 
 Population CmpAlgorithm::createPopulation(unsigned int capacity) const {
     return Population(FNCountedPtr<Population::Body>(new FeatureSets<Core::Records::Record>(capacity)));
 }
 
-std::list<GalleryIterator> CmpAlgorithm::prepareFew2Many(const std::vector<FIR>&,
-                                                         const Fn::View<Population>::Iterator&,
-                                                         unsigned int) const {
-    FN_THROW(FNEBadFunCall, "B7 records are not searched yet");
+std::list<GalleryIterator> CmpAlgorithm::prepareFew2Many(const std::vector<FIR>& probes,
+                                                         const Fn::View<Population>::Iterator& populations,
+                                                         unsigned int partitions) const {
+    const FNCountedPtr<PreparedProbes> prepared(new PreparedProbes(core_));
+    for (const FIR& probe : probes) prepared->add(probe);
+    return walkGallery(populations, partitions, probes.size(), GalleryComparer(core_, prepared), "Pcld");
+}
+
+RawMatches CmpAlgorithm::normalizeRawScores(const RawMatches& matches,
+                                            const ScoreHistogram& distribution) const {
+    return B7::normalizeRawScores(matches, distribution);
 }
 
 FNCountedPtr<ScoreMapping> CmpAlgorithm::scoreMapping() const {

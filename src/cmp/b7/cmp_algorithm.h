@@ -39,6 +39,8 @@ public:
     std::list<Implementation::GalleryIterator>
     prepareFew2Many(const std::vector<FIR>& probes, const Fn::View<Population>::Iterator& populations,
                     unsigned int partitions) const override;
+    RawMatches normalizeRawScores(const RawMatches& matches,
+                                  const ScoreHistogram& distribution) const override;
 
     FNCountedPtr<Implementation::ScoreMapping> scoreMapping() const;
     FNCountedPtr<Implementation::RatesMapping> ratesMapping() const;
