@@ -1,5 +1,6 @@
 #include "orbek/implementation/orbek_properties.h"
 
+#include "cmp/portrait/analyzer.h"
 #include "eye/cara/face_finder.h"
 #include "eye/ojo/eyes_finder.h"
 #include "eye/tracker/reference_face_tracker.h"
@@ -63,7 +64,7 @@ std::list<Property> members() {
         pending("SetVerifier", "Kx::SetRecognizer", "Set Verifier"),
         pending("SetIdentifier", "Kx::SetIdentifier", "Set Identifier"),
         property<Eye::ReferenceFaceTracker>::create("FaceTracker", "Face Tracker Engine"),
-        pending("PortraitAnalyzer", "Cmp::Portrait::Analyzer", "Portrait Analyzer"),
+        property<Cmp::Portrait::Analyzer>::create("PortraitAnalyzer", "Portrait Analyzer"),
         pending("ISOFullFrontalTest", "Kx::ISO_19794_5::FullFrontal::Test",
                 "ISO 19794-5 Full Frontal images assessment"),
         pending("FeatureTest", "Kx::Feature::Test", "Portrait feature assessment"),
