@@ -4,6 +4,7 @@
 #include "cmp/b7/packed_scoring.h"
 #include "cmp/b7/score_normalization.h"
 #include "cmp/gallery_walk.h"
+#include "cmp/portrait/analyzer.h"
 #include "eye/boca/mouth_finder.h"
 #include "eye/ojo/eyes_finder.h"
 #include "eye/raiz/bridge_finder.h"
@@ -23,8 +24,14 @@ Finders configuredFinders(const Component& component) {
     return {finder<::EyesFinder, Eye::Ojo::T8::EyesFinder>(component, "EyesFinder"),
             finder<::MouthFinder, Eye::Boca::MouthFinder>(component, "MouthFinder"),
             finder<::BridgeFinder, Eye::Raiz::BridgeFinder>(component, "BridgeFinder"),
-            [](const Face&, const SampleEvaluator::Regarded&) -> PortraitMeasures {
-                FN_THROW(FNEBadFunCall, "Portraits are not measured yet");
+            [analyzer = Portrait::Analyzer(component.subComponent("PortraitAnalyzer"))](
+                const Face& face, const SampleEvaluator::Regarded& regarded) {
+                const Portrait::Characteristics portrait = analyzer.analyze(face);
+                PortraitMeasures measures;
+                if (regarded.sharpness) measures.sharpness = portrait.sharpness();
+                if (regarded.deviationFromFrontalPose)
+                    measures.deviationFromFrontalPose = portrait.deviationFromFrontalPose();
+                return measures;
             }};
 }
 

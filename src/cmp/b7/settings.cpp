@@ -1,5 +1,6 @@
 #include "cmp/b7/settings.h"
 
+#include "cmp/portrait/analyzer.h"
 #include "eye/boca/mouth_finder.h"
 #include "eye/ojo/eyes_finder.h"
 #include "eye/raiz/bridge_finder.h"
@@ -95,8 +96,7 @@ std::list<Property> Settings::properties() {
         property<Eye::Ojo::T8::EyesFinder>::create("EyesFinder", "Eyes Finder"),
         property<Eye::Boca::MouthFinder>::create("MouthFinder", "Mouth finder"),
         property<Eye::Raiz::BridgeFinder>::create("BridgeFinder", "Bridge of the nose finder"),
-        Property(Type("Cmp::Portrait::Analyzer", "Portrait Analyzer", "", false), "PortraitAnalyzer", "",
-                 "Portrait analyzer facility", false),
+        property<Portrait::Analyzer>::create("PortraitAnalyzer", "Portrait analyzer facility"),
         property<Alternative<ScoreNormalization>>::create("ScoreNormalization",
                                                           "Enables/disables score normalization"),
         propertyWithDefault<String>::create("FIRVersion", "11.0", "Version of the FIRs created by B7."),
