@@ -23,10 +23,12 @@ private:
 
 class FIR::Implementation {
 public:
-    explicit Implementation(const Cmp::FIR& fir) : fir(fir) {}
+    explicit Implementation(const Cmp::FIR& record) : fir(record) {}
 
-    static FIR make(const Cmp::FIR& fir) { return FIR(CountedPtr<Implementation>(new Implementation(fir))); }
-    static const Cmp::FIR& of(const FIR& fir) { return fir.implementation_->fir; }
+    static FIR make(const Cmp::FIR& record) {
+        return FIR(CountedPtr<Implementation>(new Implementation(record)));
+    }
+    static const Cmp::FIR& of(const FIR& handle) { return handle.implementation_->fir; }
 
     const Cmp::FIR fir;
 };
@@ -36,8 +38,8 @@ public:
     explicit Implementation(const Configuration& configuration)
         : Comparison(configuration), population(strategy().algorithm()->createPopulation(0)) {}
 
-    static const Cmp::Population& of(const Population& population) {
-        return population.implementation_->population;
+    static const Cmp::Population& of(const Population& handle) {
+        return handle.implementation_->population;
     }
 
     Cmp::Population population;
