@@ -111,4 +111,20 @@ void products(benchmark::State& state, int pairs) {
 BENCHMARK_CAPTURE(products, one, 1)->Unit(benchmark::kMicrosecond);
 BENCHMARK_CAPTURE(products, four, 4)->Unit(benchmark::kMicrosecond);
 
+/// The same from packed features, with 1 and 5 others.
+void packedProducts(benchmark::State& state) {
+    const Encoder encoder;
+    const auto bytes = encoder.createEncodedType();
+    const unsigned char* const packed = bytes.data() + Encoder::headerSize;
+    const std::vector<PackedProducts::Probe> probes(static_cast<std::size_t>(state.range(0)),
+                                                    encoder.packedProducts().prepare(packed));
+    std::vector<PackedProducts::Sums> sums(probes.size());
+    for (auto _ : state) {
+        encoder.packedProducts().sums(packed, probes, sums.data());
+        benchmark::DoNotOptimize(sums.data());
+    }
+    state.SetItemsProcessed(state.iterations() * state.range(0));
+}
+BENCHMARK(packedProducts)->Arg(1)->Arg(5)->Unit(benchmark::kMicrosecond);
+
 } // namespace

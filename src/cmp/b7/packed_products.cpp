@@ -21,7 +21,7 @@ template <unsigned int bits> struct Planes;
 template <> struct Planes<3> {
     static constexpr int shifts[] = {0, 3, 6};
     static constexpr std::uint32_t masks[] = {0x071c0e07, 0x071c0e07, 0x071c0e07};
-    static constexpr int scale = 4; ///< the greatest power of two before a code
+    static constexpr int scale = 4; ///< the greatest power of two that a code is multiplied with
 };
 template <> struct Planes<4> {
     static constexpr int shifts[] = {0, 4};
@@ -37,12 +37,14 @@ template <> struct Planes<5> {
 /// Vectors of up to so many words go over a group without a rest.
 constexpr std::size_t vectorWords = 16;
 
-/// What one run over the words of a group needs.
+/// A run over the words of one group.
 struct GroupRun {
+    unsigned int bits;
     const unsigned char* packed;
-    std::size_t words; ///< a multiple of vectorWords
+    const unsigned char* ahead; ///< is fetched
+    std::size_t words;          ///< a multiple of vectorWords
     const short* weights;
-    const unsigned char* ahead; ///< may be null
+    std::size_t factors; ///< place among those of a probe; those of one plane lie one behind the other
 };
 
 } // namespace
@@ -81,53 +83,73 @@ HWY_INLINE hn::Vec<Pairs> pairProducts(hn::Vec<Words> codes, hn::Vec<Words> fact
 #endif
 }
 
-/// Weighted sums of the products of one group with those of N probes.
-/// @param factors of each probe; those of one plane lie one behind the other
-template <unsigned int bits, std::size_t N>
-HWY_INLINE void groupSums(const GroupRun& run, const signed char* const* factors, std::int64_t* out) {
-    constexpr std::size_t planes = std::size(Planes<bits>::shifts);
-    const Words dw;
-    const Pairs dp;
-    const Sums32 ds;
-    const std::size_t lanes = hn::Lanes(dw), planeSize = 4 * run.words;
-    hn::Vec<Sums32> sums[N], others[N];
-    for (std::size_t n = 0; n < N; ++n) sums[n] = others[n] = hn::Zero(ds);
+/// Vectors of one group's words, taken apart, and their weights.
+template <unsigned int bits> struct Codes {
+    static constexpr std::size_t planes = std::size(Planes<bits>::shifts);
+
+    HWY_INLINE Codes(const unsigned char* packed, const short* weightsOfThem) {
+        const Words d;
+        const auto words = hn::BitCast(d, hn::LoadU(Bytes(), packed));
+        first = hn::And(words, hn::Set(d, Planes<bits>::masks[0]));
+        second = hn::And(hn::ShiftRight<Planes<bits>::shifts[1]>(words), hn::Set(d, Planes<bits>::masks[1]));
+        last = hn::And(hn::ShiftRight<Planes<bits>::shifts[planes - 1]>(words),
+                       hn::Set(d, Planes<bits>::masks[planes - 1]));
+        weights = hn::LoadU(Pairs(), weightsOfThem);
+    }
+
+    /// Adds the weighted products with the factors of one probe.
+    HWY_INLINE void addProducts(const signed char* factors, std::size_t planeSize, hn::Vec<Sums32>& sum,
+                                hn::Vec<Sums32>& other) const {
+        const auto plane = [&](std::size_t k) HWY_ATTR {
+            const auto* const bytes = reinterpret_cast<const std::uint8_t*>(factors + k * planeSize);
+            return hn::BitCast(Words(), hn::LoadU(Bytes(), bytes));
+        };
+        auto products = hn::Add(pairProducts(first, plane(0)), pairProducts(second, plane(1)));
+        if constexpr (planes == 3) products = hn::Add(products, pairProducts(last, plane(2)));
+        sum = hn::ReorderWidenMulAccumulate(Sums32(), products, weights, sum, other);
+    }
+
+    hn::Vec<Words> first, second, last;
+    hn::Vec<Pairs> weights;
+};
+
+/// Exact, in 64 bits.
+HWY_INLINE std::int64_t sumOfLanes(hn::Vec<Sums32> v) {
+    const hn::RepartitionToWide<Sums32> d;
+    const hn::Half<Sums32> half;
+    const auto low = hn::PromoteTo(d, hn::LowerHalf(half, v)),
+               high = hn::PromoteTo(d, hn::UpperHalf(half, v));
+    return hn::GetLane(hn::SumOfLanes(d, hn::Add(low, high)));
+}
+
+/// Weighted sums of the products of one group with those of several probes, each of which has registers of
+/// its own.
+/// @param out of each probe in turn, `stride` apart
+template <unsigned int bits, std::size_t... n>
+HWY_INLINE void groupSums(std::index_sequence<n...>, const GroupRun& run, const signed char* const* probes,
+                          std::int64_t* out, std::size_t stride) {
+    const Sums32 d;
+    const std::size_t lanes = hn::Lanes(d), planeSize = 4 * run.words;
+    const signed char* const factors[] = {probes[n] + run.factors...};
+    hn::Vec<Sums32> sums[] = {(static_cast<void>(n), hn::Zero(d))...};
+    hn::Vec<Sums32> others[] = {(static_cast<void>(n), hn::Zero(d))...};
     for (std::size_t w = 0; w < run.words; w += vectorWords) {
-        if (run.ahead) hwy::Prefetch(run.ahead + 4 * w);
+        hwy::Prefetch(run.ahead + 4 * w);
         for (std::size_t i = w; i < w + vectorWords; i += lanes) {
-            const auto load = [&](const void* bytes) HWY_ATTR {
-                return hn::BitCast(dw, hn::LoadU(Bytes(), static_cast<const std::uint8_t*>(bytes) + 4 * i));
-            };
-            const auto packed = load(run.packed);
-            const auto codes0 = hn::And(packed, hn::Set(dw, Planes<bits>::masks[0]));
-            const auto codes1 =
-                hn::And(hn::ShiftRight<Planes<bits>::shifts[1]>(packed), hn::Set(dw, Planes<bits>::masks[1]));
-            const auto codes2 = hn::And(hn::ShiftRight<Planes<bits>::shifts[planes - 1]>(packed),
-                                        hn::Set(dw, Planes<bits>::masks[planes - 1]));
-            const auto weights = hn::LoadU(dp, run.weights + 2 * i);
-            for (std::size_t n = 0; n < N; ++n) {
-                auto products = hn::Add(pairProducts(codes0, load(factors[n])),
-                                        pairProducts(codes1, load(factors[n] + planeSize)));
-                if constexpr (planes == 3)
-                    products = hn::Add(products, pairProducts(codes2, load(factors[n] + 2 * planeSize)));
-                sums[n] = hn::ReorderWidenMulAccumulate(ds, products, weights, sums[n], others[n]);
-            }
+            const Codes<bits> codes(run.packed + 4 * i, run.weights + 2 * i);
+            (codes.addProducts(factors[n] + 4 * i, planeSize, sums[n], others[n]), ...);
         }
     }
-    for (std::size_t n = 0; n < N; ++n) {
-        HWY_ALIGN std::int32_t lane[vectorWords];
-        hn::Store(hn::Add(sums[n], others[n]), ds, lane);
-        std::int64_t sum = 0;
-        for (std::size_t i = 0; i < lanes; ++i) sum += lane[i];
-        out[n] = sum;
-    }
+    ((out[n * stride] = sumOfLanes(hn::Add(sums[n], others[n]))), ...);
 }
 #else
-template <unsigned int bits, std::size_t N>
-void groupSums(const GroupRun& run, const signed char* const* factors, std::int64_t* out) {
+template <unsigned int bits, std::size_t... n>
+void groupSums(std::index_sequence<n...>, const GroupRun& run, const signed char* const* probes,
+               std::int64_t* out, std::size_t stride) {
     constexpr std::size_t planes = std::size(Planes<bits>::shifts);
-    for (std::size_t n = 0; n < N; ++n) {
-        out[n] = 0;
+    for (const std::size_t i : {n...}) {
+        const signed char* const factors = probes[i] + run.factors;
+        std::int64_t total = 0;
         for (std::size_t w = 0; w < run.words; ++w) {
             std::uint32_t packed;
             std::memcpy(&packed, run.packed + 4 * w, 4);
@@ -135,39 +157,44 @@ void groupSums(const GroupRun& run, const signed char* const* factors, std::int6
             for (std::size_t k = 0; k < planes; ++k) {
                 const std::uint32_t codes = packed >> Planes<bits>::shifts[k] & Planes<bits>::masks[k];
                 for (unsigned int b = 0; b < 4; ++b)
-                    sum += static_cast<int>(codes >> 8 * b & 0xff) * factors[n][4 * (k * run.words + w) + b];
+                    sum += static_cast<int>(codes >> 8 * b & 0xff) * factors[4 * (k * run.words + w) + b];
             }
-            out[n] += std::int64_t{sum} * run.weights[2 * w];
+            total += std::int64_t{sum} * run.weights[2 * w];
         }
+        out[i * stride] = total;
     }
 }
 #endif
 
+/// Of all groups.
 template <std::size_t N>
-void sums(unsigned int bits, const GroupRun& run, const signed char* const* factors, std::int64_t* out) {
-    switch (bits) {
-    case 3:
-        return groupSums<3, N>(run, factors, out);
-    case 4:
-        return groupSums<4, N>(run, factors, out);
-    default:
-        return groupSums<5, N>(run, factors, out);
-    }
+void sums(std::span<const GroupRun> runs, const signed char* const* probes, std::int64_t* out) {
+    const std::make_index_sequence<N> n;
+    for (std::size_t g = 0; g < runs.size(); ++g) switch (runs[g].bits) {
+        case 3:
+            groupSums<3>(n, runs[g], probes, out + g, PackedProducts::mostGroups);
+            break;
+        case 4:
+            groupSums<4>(n, runs[g], probes, out + g, PackedProducts::mostGroups);
+            break;
+        default:
+            groupSums<5>(n, runs[g], probes, out + g, PackedProducts::mostGroups);
+        }
 }
-void sums1(unsigned int bits, const GroupRun& run, const signed char* const* factors, std::int64_t* out) {
-    sums<1>(bits, run, factors, out);
+void sums1(std::span<const GroupRun> runs, const signed char* const* probes, std::int64_t* out) {
+    sums<1>(runs, probes, out);
 }
-void sums2(unsigned int bits, const GroupRun& run, const signed char* const* factors, std::int64_t* out) {
-    sums<2>(bits, run, factors, out);
+void sums2(std::span<const GroupRun> runs, const signed char* const* probes, std::int64_t* out) {
+    sums<2>(runs, probes, out);
 }
-void sums3(unsigned int bits, const GroupRun& run, const signed char* const* factors, std::int64_t* out) {
-    sums<3>(bits, run, factors, out);
+void sums3(std::span<const GroupRun> runs, const signed char* const* probes, std::int64_t* out) {
+    sums<3>(runs, probes, out);
 }
-void sums4(unsigned int bits, const GroupRun& run, const signed char* const* factors, std::int64_t* out) {
-    sums<4>(bits, run, factors, out);
+void sums4(std::span<const GroupRun> runs, const signed char* const* probes, std::int64_t* out) {
+    sums<4>(runs, probes, out);
 }
-void sums5(unsigned int bits, const GroupRun& run, const signed char* const* factors, std::int64_t* out) {
-    sums<5>(bits, run, factors, out);
+void sums5(std::span<const GroupRun> runs, const signed char* const* probes, std::int64_t* out) {
+    sums<5>(runs, probes, out);
 }
 
 } // namespace
@@ -237,7 +264,7 @@ PackedProducts::PackedProducts(const Blocks& blocks) {
     for (const auto& block : blocks) {
         if (block->bits() < 3 || block->bits() > 5) FN_THROW(FNEBadArg, "Products of blocks of other bits");
         if (groups_.empty() || groups_.back().bits != block->bits())
-            groups_.push_back({block->bits(), words, 0, {}});
+            groups_.push_back({.bits = block->bits(), .begin = words, .blocks = {}});
         Group& group = groups_.back();
         group.blocks.push_back({block->count(), block->size() / 4, int{block->wordOffset()}});
         group.words += block->size() / 4;
@@ -250,10 +277,12 @@ PackedProducts::PackedProducts(const Blocks& blocks) {
         const bool before = group.begin + group.words + rest > words;
         if (before && rest > group.begin) FN_THROW(FNEBadArg, "Products of features that are too short");
         group.pad = before ? rest : 0;
+        group.padded = group.words + rest;
+        group.scaleBits = std::countr_zero(static_cast<unsigned int>(planesOf(group.bits).scale));
         group.weights = weights_.size();
         group.factors = factors_;
-        weights_.resize(weights_.size() + 2 * wholeVectors(group.words));
-        factors_ += 4 * planesOf(group.bits).shifts.size() * wholeVectors(group.words);
+        weights_.resize(weights_.size() + 2 * group.padded);
+        factors_ += 4 * planesOf(group.bits).shifts.size() * group.padded;
         fillWeights(group);
     }
 }
@@ -282,7 +311,7 @@ PackedProducts::Probe PackedProducts::prepare(const unsigned char* packed) const
     for (std::size_t g = 0; g < groups_.size(); ++g) {
         const Group& group = groups_[g];
         const int codes = 1 << group.bits, scale = planesOf(group.bits).scale;
-        const std::size_t planeSize = 4 * wholeVectors(group.words);
+        const std::size_t planeSize = 4 * group.padded;
         const std::vector<Place> places = placesOf(group.bits);
         signed char* out = probe.factors.data() + group.factors + 4 * group.pad;
         std::int64_t sum = 0;
@@ -306,38 +335,45 @@ PackedProducts::Probe PackedProducts::prepare(const unsigned char* packed) const
 
 void PackedProducts::sums(const unsigned char* packed, std::span<const Probe> probes, Sums* out,
                           const unsigned char* ahead) const {
+    std::array<GroupRun, mostGroups> runs;
+    for (std::size_t g = 0; g < groups_.size(); ++g) {
+        const Group& group = groups_[g];
+        const std::size_t begin = 4 * (group.begin - group.pad);
+        runs[g] = {group.bits,
+                   packed + begin,
+                   (ahead ? ahead : packed) + begin,
+                   group.padded,
+                   weights_.data() + group.weights,
+                   group.factors};
+    }
     while (!probes.empty()) {
         const std::size_t n = std::min(probesAtOnce, probes.size());
-        for (std::size_t g = 0; g < groups_.size(); ++g) {
-            const Group& group = groups_[g];
-            const std::size_t begin = 4 * (group.begin - group.pad);
-            const GroupRun run{packed + begin, wholeVectors(group.words), weights_.data() + group.weights,
-                               ahead ? ahead + begin : nullptr};
-            const signed char* factors[probesAtOnce];
-            std::int64_t sums[probesAtOnce];
-            for (std::size_t i = 0; i < n; ++i) factors[i] = probes[i].factors.data() + group.factors;
-            switch (n) {
-            case 1:
-                HWY_DYNAMIC_DISPATCH(sums1)(group.bits, run, factors, sums);
-                break;
-            case 2:
-                HWY_DYNAMIC_DISPATCH(sums2)(group.bits, run, factors, sums);
-                break;
-            case 3:
-                HWY_DYNAMIC_DISPATCH(sums3)(group.bits, run, factors, sums);
-                break;
-            case 4:
-                HWY_DYNAMIC_DISPATCH(sums4)(group.bits, run, factors, sums);
-                break;
-            default:
-                HWY_DYNAMIC_DISPATCH(sums5)(group.bits, run, factors, sums);
-            }
-            const int scale = planesOf(group.bits).scale;
-            for (std::size_t i = 0; i < n; ++i) out[i][g] = 2 * (sums[i] / scale) - probes[i].subtrahends[g];
+        const signed char* factors[probesAtOnce];
+        std::int64_t sums[probesAtOnce][mostGroups];
+        for (std::size_t i = 0; i < n; ++i) factors[i] = probes[i].factors.data();
+        const std::span<const GroupRun> all(runs.data(), groups_.size());
+        switch (n) {
+        case 1:
+            HWY_DYNAMIC_DISPATCH(sums1)(all, factors, sums[0]);
+            break;
+        case 2:
+            HWY_DYNAMIC_DISPATCH(sums2)(all, factors, sums[0]);
+            break;
+        case 3:
+            HWY_DYNAMIC_DISPATCH(sums3)(all, factors, sums[0]);
+            break;
+        case 4:
+            HWY_DYNAMIC_DISPATCH(sums4)(all, factors, sums[0]);
+            break;
+        default:
+            HWY_DYNAMIC_DISPATCH(sums5)(all, factors, sums[0]);
         }
+        for (std::size_t i = 0; i < n; ++i)
+            for (std::size_t g = 0; g < groups_.size(); ++g)
+                out[i][g] = 2 * (sums[i][g] >> groups_[g].scaleBits) - probes[i].subtrahends[g];
         probes = probes.subspan(n);
         out += n;
-        ahead = nullptr;
+        for (GroupRun& run : runs) run.ahead = run.packed;
     }
 }
 

@@ -52,6 +52,8 @@ private:
         std::size_t begin; ///< packed words before it
         std::size_t words = 0;
         std::vector<Block> blocks;
+        std::size_t padded = 0;               ///< words in whole vectors
+        int scaleBits = 0;                    ///< log2 of what all codes are multiplied with
         std::size_t pad = 0;                  ///< words before it that its vectors have, with factors 0
         std::size_t weights = 0, factors = 0; ///< places of its own
     };
