@@ -44,7 +44,7 @@ public:
     Setup() : folder_(std::filesystem::temp_directory_path() / ("orbek-bench-" + std::to_string(getpid()))) {
         std::filesystem::create_directory(folder_);
         constexpr std::size_t raw = 20604, components = 5912;
-        std::mt19937 random(1);
+        std::minstd_rand random(1);
         Transformation t{2e-5f, Fn::Matrix<signed char>(raw, components), FNVector<float>(raw, 0.3f),
                          FNVector<float>(components, 0.0f), FNVector<float>(components, 0.0f)};
         std::generate_n(t.matrix.getExclusive(), t.matrix.size(),
@@ -154,9 +154,10 @@ void processSample(benchmark::State& state) {
     FNImage<unsigned char> photo(640, 480);
     std::generate_n(photo.getExclusive(), photo.size(), [&] { return static_cast<unsigned char>(random()); });
     const FNImageReference image = FNImageReferenceFactory::create(photo);
+    const CmpAlgorithm& algorithm = *setup().algorithm();
     for (auto _ : state)
         benchmark::DoNotOptimize(
-            setup().algorithm()->processSample(image, {}, {280, 200}, {360, 210}, {310, 290}, {318, 203}));
+            algorithm.processSample(image, {}, {280, 200}, {360, 210}, {310, 290}, {318, 203}));
 }
 BENCHMARK(processSample)->UseRealTime()->Unit(benchmark::kMillisecond);
 

@@ -12,15 +12,16 @@
 
 /// B7 with a transformation of a few weights, and finders that find what a test tells them to.
 class B7Setup : public testing::Test {
-protected:
-    using Algorithm = FNCountedPtr<Cmp::B7::CmpAlgorithm>;
-
+public:
     /// What the finders answer; nothing where the confidence is 0.
     struct Found {
         FacialFeatureLocation left{{0, 0}, 0, 0}, right{{0, 0}, 0, 0};
         FacialFeatureLocation mouth{{0, 0}, 0, 0}, bridge{{0, 0}, 0, 0};
         Cmp::B7::PortraitMeasures portrait;
     };
+
+protected:
+    using Algorithm = FNCountedPtr<Cmp::B7::CmpAlgorithm>;
 
     static void SetUpTestSuite() {
         folder_ = new ScratchFolder;
