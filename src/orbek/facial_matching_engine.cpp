@@ -25,9 +25,9 @@ Score FacialMatchingEngine::compare(const FIR& first, const FIR& second) const {
 CountedPtr<std::list<Score>> FacialMatchingEngine::compare(const FIR& fir,
                                                            const Population& population) const {
     const CountedPtr<std::list<Score>> result(new std::list<Score>);
-    for (const Cmp::Score& score : implementation_->strategy().compare(
-             FIR::Implementation::of(fir), Population::Implementation::of(population)))
-        result->emplace_back(score.value());
+    const std::list<Cmp::Score> scores = implementation_->strategy().compare(
+        FIR::Implementation::of(fir), Population::Implementation::of(population));
+    for (const Cmp::Score& score : scores) result->emplace_back(score.value());
     return result;
 }
 
@@ -37,9 +37,9 @@ CountedPtr<std::list<Match>> FacialMatchingEngine::bestMatches(const FIR& fir, c
     const CountedPtr<std::list<Match>> result(new std::list<Match>);
     const std::list<Cmp::Strategy::Probe> probes{
         {FIR::Implementation::of(fir), Cmp::Score(threshold), maxMatches}};
-    for (const Cmp::Match& match :
-         *implementation_->strategy().compare(probes, Population::Implementation::of(population)).front())
-        result->push_back({match.id, match.score.value()});
+    const Cmp::Strategy::Results found =
+        implementation_->strategy().compare(probes, Population::Implementation::of(population));
+    for (const Cmp::Match& match : *found.front()) result->push_back({match.id, match.score.value()});
     return result;
 }
 

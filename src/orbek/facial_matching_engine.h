@@ -16,7 +16,8 @@ struct Match {
 /// Compares records. Any number of threads may use one engine.
 ///
 ///     const Orbek::FacialMatchingEngine engine(configuration);
-///     for (const Orbek::Match& match : *engine.bestMatches(probe, people, 0.5f, 10))
+///     const auto matches = engine.bestMatches(probe, people, 0.5f, 10);
+///     for (const Orbek::Match& match : *matches)
 ///         std::cout << match.name << " " << match.score << "\n";
 class [[gnu::visibility("default")]] FacialMatchingEngine {
 public:
