@@ -71,17 +71,20 @@ void rank(benchmark::State& state, bool plain) {
 BENCHMARK_CAPTURE(rank, plain, true)->Unit(benchmark::kMillisecond);
 BENCHMARK_CAPTURE(rank, fast, false)->Unit(benchmark::kMillisecond);
 
-void project(benchmark::State& state) {
-    std::mt19937 random(1);
+/// The integers of the projection.
+void project(benchmark::State& state, bool plain) {
+    std::minstd_rand random(1);
     Fn::Matrix<signed char> m(20608, 5912);
     std::generate_n(m.getExclusive(), m.size(), [&] { return static_cast<signed char>(random()); });
-    FNVector<float> v(20604);
-    std::generate_n(v.getExclusive(), v.size(), [&] { return static_cast<float>(random() % 1000); });
-    const FNVector<float> base(5912, 0.0f);
-    for (auto _ : state) benchmark::DoNotOptimize(Cmp::multiplyDigitized(v, m, 1.0f, base));
+    FNVector<short> v(20608);
+    std::generate_n(v.getExclusive(), v.size(), [&] { return static_cast<short>(random() % 1000); });
+    const Cmp::FPMatVecMultiplier multiplier;
+    for (auto _ : state)
+        benchmark::DoNotOptimize(plain ? multiplier.leftMultiplyPlain(v, m) : multiplier.leftMultiply(v, m));
     state.SetBytesProcessed(state.iterations() * static_cast<std::int64_t>(m.size()));
 }
-BENCHMARK(project)->Unit(benchmark::kMillisecond);
+BENCHMARK_CAPTURE(project, plain, true)->Unit(benchmark::kMillisecond);
+BENCHMARK_CAPTURE(project, fast, false)->Unit(benchmark::kMillisecond);
 
 void decode(benchmark::State& state) {
     const Encoder encoder;
