@@ -53,8 +53,8 @@ int detect(const Options& options) {
 
 int eyes(const Options& options) {
     const Eval::LandmarkFinders finders{
-        Labelled::makeFaceFinder(options.etc), Eval::makeEyesFinder(options.etc, options.settings),
-        Labelled::makeMouthFinder(options.etc), Eval::makeBridgeFinder(options.etc)};
+        Labelled::makeFaceFinder(options.etc), Labelled::makeEyesFinder(options.etc, options.settings),
+        Labelled::makeMouthFinder(options.etc), Labelled::makeBridgeFinder(options.etc)};
     const Eval::LandmarkReport report =
         Eval::measureLandmarks(finders, options.selection, options.eyeDistances);
     Eval::printLandmarks(report, std::cout);
