@@ -6,10 +6,12 @@
 #include "train/face_training.h"
 #include "train/feature_training.h"
 #include "train/l5_training.h"
+#include "train/portrait_training.h"
 #include "train/synth_training.h"
 
 #include <CLI/CLI.hpp>
 
+#include <functional>
 #include <iostream>
 
 int main(int argc, char** argv) {
@@ -18,8 +20,8 @@ int main(int argc, char** argv) {
     std::string data, folder;
     std::uint64_t seed = 1;
     int threads = 2;
-    using Task =
-        void (*)(const std::filesystem::path& data, const std::filesystem::path& folder, std::uint64_t seed);
+    using Path = std::filesystem::path;
+    using Task = std::function<void(const Path& data, const Path& folder, std::uint64_t seed)>;
     const auto training = [&](const char* name, const char* doc, Task task) {
         CLI::App* const sub = app.add_subcommand(name, doc);
         sub->add_option("--data", data, "Root of the labelled images")
@@ -32,6 +34,7 @@ int main(int argc, char** argv) {
             Fn::Numeric::setBlasThreads(threads);
             task(data, folder, seed);
         });
+        return sub;
     };
     training("face", "The eleven files of the face finder", Train::trainFaceFinder);
     training("eyes", "The file of the eyes finder", Train::trainEyesFinder);
@@ -49,6 +52,16 @@ int main(int argc, char** argv) {
         ->check(CLI::ExistingFile);
     measure->callback([&] { Train::measureSynth(data, samples); });
     training("l5", "The transformation and the mapping files of the L5 comparison", Train::trainL5);
+    std::string etc, cache, only;
+    CLI::App* const portrait =
+        training("portrait", "The files of the portrait analyser", [&](const auto&...) {
+            Train::trainPortrait({data, etc, cache, seed}, folder, only);
+        });
+    portrait->add_option("--etc", etc, "Unpacked models of the finders")
+        ->required()
+        ->check(CLI::ExistingDirectory);
+    portrait->add_option("--cache", cache, "Folder that keeps extracted features")->required();
+    portrait->add_option("--only", only, "One step, such as age or mouth");
     std::string scores, algorithm;
     CLI::App* const calibration = app.add_subcommand(
         "calibrate", "The score and rate mapping files of a comparison algorithm, from scores of pairs");
