@@ -5,6 +5,7 @@
 #include "eval/finder_access.h"
 #include "eval/landmarks.h"
 #include "eval/plot.h"
+#include "eval/portrait.h"
 #include "eval/yardsticks.h"
 #include "fn/exception.h"
 
@@ -74,6 +75,14 @@ int eyes(const Options& options) {
     return statusOf(report.failures);
 }
 
+int portrait(const Options& options) {
+    const Eval::PortraitReports reports =
+        Eval::measurePortraits(options.etc, options.selection, options.eyeDistances);
+    Eval::printPortraits(reports, std::cout);
+    if (!options.json.empty()) writeFile(options.json, Eval::portraitsJson(reports));
+    return statusOf(reports.failures);
+}
+
 CLI::App* report(CLI::App& app, const char* name, const char* doc, Options& options) {
     CLI::App* const command = app.add_subcommand(name, doc);
     Eval::Selection& selection = options.selection;
@@ -126,8 +135,11 @@ int main(int argc, char** argv) {
     eyesCommand->add_option("--settings", options.settings, "Thresholds of the eyes finder")
         ->check(CLI::IsMember({"Strict", "Tolerant"}))
         ->capture_default_str();
+    CLI::App* const portraitCommand =
+        report(app, "portrait", "How often the portrait analyser is right", options);
     CLI11_PARSE(app, argc, argv);
     try {
+        if (*portraitCommand) return portrait(options);
         return *detectCommand ? detect(options) : eyes(options);
     } catch (const std::exception& e) {
         std::cerr << "orbek-eval: " << e.what() << "\n";

@@ -110,6 +110,15 @@ Points68::Extent Points68::extent(FNPos leftEye, FNPos rightEye) const {
     return {along(chinPoint, down(across)), left, right};
 }
 
+std::optional<bool> frontalLight(const Row& row) {
+    constexpr double frontal = 25, lateral = 45, high = 50;
+    const auto azimuth = row.number("light_azimuth"), elevation = row.number("light_elevation");
+    if (!azimuth || !elevation) return {};
+    if (std::abs(*azimuth) > lateral) return false;
+    if (std::abs(*azimuth) <= frontal && std::abs(*elevation) < high) return true;
+    return {};
+}
+
 std::optional<double> ageOf(const Row& row) {
     if (const auto years = row.number("age")) return years;
     const std::string text = row.text("age");

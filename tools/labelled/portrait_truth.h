@@ -46,6 +46,10 @@ private:
     std::array<FNPos, 68> points_;
 };
 
+/// Whether the light comes from the front, up to 25 degrees to a side, or from more than 45 degrees; nothing
+/// in between, for light from high above or below, and if it is unknown.
+std::optional<bool> frontalLight(const Row& row);
+
 /// Years, the middle of a range where only that is known.
 std::optional<double> ageOf(const Row& row);
 

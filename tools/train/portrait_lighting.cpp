@@ -54,7 +54,7 @@ Pixels meanOfSome(const Light& light, std::mt19937_64& random) {
 } // namespace
 
 LightingModel trainLighting(const PortraitSet& light, std::mt19937_64& random) {
-    constexpr int means = 5, mixtures = 140;
+    constexpr int means = 4, mixtures = 100;
     constexpr std::size_t fewestPersons = 4;
     constexpr float sigma = 0.15f;
     std::map<std::pair<int, int>, Light> lights;
@@ -96,8 +96,8 @@ LightingModel trainLighting(const PortraitSet& light, std::mt19937_64& random) {
                          Fn::Matrix<float>(rows.size(), rows.front().first.size()),
                          Fn::Matrix<float>(rows.size(), SpharTransformator::coefficients)}};
     for (std::size_t r = 0; r < rows.size(); ++r) {
-        // Eight bits of each pixel; the reader brings images to one length.
-        constexpr double levels = 255;
+        // Seven bits of each pixel; the reader brings images to one length.
+        constexpr double levels = 127;
         const auto& [pixels, harmonics] = rows[r];
         const double greatest = *std::max_element(pixels.begin(), pixels.end());
         for (std::size_t k = 0; k < pixels.size(); ++k)
@@ -107,18 +107,6 @@ LightingModel trainLighting(const PortraitSet& light, std::mt19937_64& random) {
             model.data.coefficientRows(r, k) = static_cast<float>(harmonics[k]);
     }
     return model;
-}
-
-std::optional<bool> uniformlyLit(const Labelled::Row& row) {
-    constexpr double frontal = 25, lateral = 45, high = 50;
-    const auto azimuth = row.number("light_azimuth"), elevation = row.number("light_elevation");
-    if (!azimuth || !elevation) {
-        if (row.number("pose") == 0.0) return true;
-        return {};
-    }
-    if (std::abs(*azimuth) > lateral) return false;
-    if (std::abs(*azimuth) <= frontal && std::abs(*elevation) < high) return true;
-    return {};
 }
 
 FNImage<float> lightingWindow(std::span<const float> columns) {

@@ -3,7 +3,6 @@
 #include "cmp/portrait/sphar_transformator.h"
 #include "train/portrait_samples.h"
 
-#include <optional>
 #include <random>
 
 namespace Train {
@@ -16,10 +15,6 @@ struct LightingModel {
 /// Each face is a mean over several persons, so that it shows none of them: under each light that there are
 /// pictures of, and under mixtures of these lights.
 LightingModel trainLighting(const PortraitSet& light, std::mt19937_64& random);
-
-/// Whether light comes about from the front: known from its direction (nothing in between frontal and
-/// lateral), and taken for granted of frontal portraits.
-std::optional<bool> uniformlyLit(const Labelled::Row& row);
 
 /// The window that a vector of columns was made from.
 FNImage<float> lightingWindow(std::span<const float> columns);

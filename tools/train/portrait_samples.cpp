@@ -168,8 +168,17 @@ public:
         set_.rows = Labelled::readLabels(sources.data / folder / "labels.tsv");
     }
 
-    PortraitSet faces(const std::vector<PortraitKind>& kinds, std::size_t most) {
-        if (readCache(kinds)) return set_;
+    PortraitSet faces(const std::vector<PortraitKind>& kinds, const std::vector<PortraitKind>& wanted,
+                      std::size_t most) {
+        if (!cached(kinds)) extractFaces(kinds, most);
+        set_.samples.clear();
+        set_.columns_.clear();
+        if (!readCache(wanted))
+            FN_THROW(FNEIOError, sources_.cache.string() + ": features that cannot be read back");
+        return set_;
+    }
+
+    void extractFaces(const std::vector<PortraitKind>& kinds, std::size_t most) {
         clear();
         const Finders finders(sources_.etc);
         const std::size_t step = (set_.rows.size() + most - 1) / most;
@@ -189,7 +198,6 @@ public:
                     iris);
         }
         writeCache();
-        return set_;
     }
 
     PortraitSet eyePictures() {
@@ -202,10 +210,7 @@ public:
         std::normal_distribution<float> normal(0, 1);
         for (std::size_t r = 0; r < set_.rows.size(); ++r) {
             const FNImage<float> picture = Fn::readImage(set_.rows[r].image().string()).toMonoFloat();
-            // Neighbouring pictures can show one person, so whole runs of them go to one part.
-            constexpr std::size_t run = 40;
-            const Labelled::Split split =
-                Labelled::splitOf("eyes" + set_.rows[r].text("eyes_open") + std::to_string(r / run));
+            const Labelled::Split split = Labelled::splitOf(set_.rows[r].splitKey());
             for (int v = 0; v < (split == Labelled::Split::train ? variants : 1); ++v) {
                 const float d = v == 0 ? 0.0f : 1.0f;
                 const float size = share * std::exp(0.12f * d * normal(random_));
@@ -262,6 +267,12 @@ private:
         return sources_.cache / name;
     }
     static std::string nameOf(PortraitKind kind) { return "kind" + std::to_string(static_cast<int>(kind)); }
+
+    bool cached(const std::vector<PortraitKind>& kinds) const {
+        return std::filesystem::exists(file("samples")) &&
+               std::all_of(kinds.begin(), kinds.end(),
+                           [&](PortraitKind kind) { return std::filesystem::exists(file(nameOf(kind))); });
+    }
 
     bool readCache(const std::vector<PortraitKind>& kinds) {
         std::ifstream samples(file("samples"), std::ios::binary);
@@ -328,8 +339,9 @@ std::size_t PortraitSet::dimension(PortraitKind kind) const {
 }
 
 PortraitSet loadPortraits(const PortraitSources& sources, const std::string& folder,
-                          const std::vector<PortraitKind>& kinds, std::size_t most) {
-    return PortraitSampler(sources, folder).faces(kinds, most);
+                          const std::vector<PortraitKind>& kinds, const std::vector<PortraitKind>& wanted,
+                          std::size_t most) {
+    return PortraitSampler(sources, folder).faces(kinds, wanted, most);
 }
 
 PortraitSet loadEyePictures(const PortraitSources& sources, const std::string& folder) {

@@ -69,10 +69,12 @@ struct PortraitSources {
     std::uint64_t seed = 1;
 };
 
-/// The set in a folder below the data. @param kinds to extract @param most rows at most, the others being
-/// left out evenly
+/// The set in a folder below the data. @param kinds all that are ever extracted of it
+/// @param wanted those of them that are returned
+/// @param most rows at most, the others being left out evenly
 PortraitSet loadPortraits(const PortraitSources& sources, const std::string& folder,
-                          const std::vector<PortraitKind>& kinds, std::size_t most = 1000000);
+                          const std::vector<PortraitKind>& kinds, const std::vector<PortraitKind>& wanted,
+                          std::size_t most = 1000000);
 
 /// Vectors of single eyes, from pictures of one eye each; the same interface, kind closedEyes only. The eye
 /// is taken to be as large as it is on average.

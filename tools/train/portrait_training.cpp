@@ -111,18 +111,29 @@ public:
         : sources_(sources), folder_(folder), random_(sources.seed) {}
 
     void run(const std::string& only) {
-        const std::vector<std::pair<std::string, std::function<void()>>> steps{
-            {"glasses", [&] { glasses(); }}, {"lighting", [&] { lighting(); }},
-            {"eyes", [&] { closedEyes(); }}, {"gaze", [&] { gaze(); }},
-            {"head", [&] { head(); }},       {"mouth", [&] { mouth(); }},
-            {"pose", [&] { pose(); }},       {"ethnicity", [&] { ethnicity(); }},
-            {"age", [&] { age(); }},         {"gender", [&] { gender(); }},
+        struct Step {
+            std::string name;
+            std::vector<K> kinds;
+            void (PortraitTraining::*run)();
         };
-        for (const auto& [name, step] : steps)
-            if (only.empty() || only == name) {
-                step();
-                sets_.clear();
-            }
+        const Step steps[] = {
+            {"glasses", {K::glasses}, &PortraitTraining::glasses},
+            {"lighting", {K::lighting}, &PortraitTraining::lighting},
+            {"eyes", {K::closedEyes}, &PortraitTraining::closedEyes},
+            {"gaze", {K::gazeAway, K::iris}, &PortraitTraining::gaze},
+            {"head", {K::head}, &PortraitTraining::head},
+            {"mouth", {K::mouth}, &PortraitTraining::mouth},
+            {"pose", {K::pose}, &PortraitTraining::pose},
+            {"ethnicity", {K::ethnicity}, &PortraitTraining::ethnicity},
+            {"age", {K::age}, &PortraitTraining::age},
+            {"gender", {K::gender}, &PortraitTraining::gender},
+        };
+        for (const Step& step : steps) {
+            if (!only.empty() && only != step.name) continue;
+            wanted_ = step.kinds;
+            (this->*step.run)();
+            sets_.clear();
+        }
     }
 
 private:
@@ -143,9 +154,10 @@ private:
         };
         constexpr std::size_t all = 1000000, ofLfw = 4000;
         return sets_
-            .emplace(folder, folder == "portraits/eyes" ? loadEyePictures(sources_, folder)
-                                                        : loadPortraits(sources_, folder, kinds.at(folder),
-                                                                        folder == "people/lfw" ? ofLfw : all))
+            .emplace(folder, folder == "portraits/eyes"
+                                 ? loadEyePictures(sources_, folder)
+                                 : loadPortraits(sources_, folder, kinds.at(folder), wanted_,
+                                                 folder == "people/lfw" ? ofLfw : all))
             .first->second;
     }
 
@@ -226,7 +238,7 @@ private:
         };
         Learning learning = collect({"portraits/mtfl", "video/webcam"}, mostSamples, use);
         balance(learning.samples);
-        classifier("gldisc.dat", learning, 10, {1, 3, 10}, {-0.8, 0.95, true, 1});
+        classifier("gldisc.dat", learning, 10, {1, 3}, {-0.8, 0.95, true, 1});
     }
 
     void pose() {
@@ -244,7 +256,7 @@ private:
         Learning learning =
             collect({"portraits/mtfl", "scenes/faces", "people/celeba", "people/lfw"}, mostSamples, use);
         balance(learning.samples);
-        classifier("fpdisc.dat", learning, 16, {1, 3, 10}, {-0.42, 0.95, false, -1.5});
+        classifier("fpdisc.dat", learning, 16, {3}, {-0.42, 0.95, false, -1.5});
     }
 
     void mouth() {
@@ -259,7 +271,7 @@ private:
         Learning learning =
             collect({"portraits/mtfl", "scenes/faces", "people/celeba", "people/lfw"}, mostSamples, use);
         balance(learning.samples);
-        classifier("cmdisc.dat", learning, 24, {0.3, 1, 3}, {-0.5, 0.95, true, 1});
+        classifier("cmdisc.dat", learning, 24, {1}, {-0.5, 0.95, true, 1});
     }
 
     void closedEyes() {
@@ -294,7 +306,7 @@ private:
         Learning learning = learningOf(std::move(train), dev, mostSamples, random_);
         balance(learning.samples);
         // Both eyes of a portrait have to pass.
-        classifier("cedisc.dat", learning, 16, {0.3, 1, 3}, {0.67, 0.975, true, 1.5});
+        classifier("cedisc.dat", learning, 16, {1}, {0.67, 0.975, true, 1.5});
     }
 
     void gaze() {
@@ -311,7 +323,7 @@ private:
         Learning learning =
             collect({"portraits/mtfl", "scenes/faces", "people/celeba", "people/lfw"}, mostSamples, use);
         balance(learning.samples);
-        classifier("gadisc.dat", learning, 24, {0.3, 1, 3}, {-0.5, 0.975, true, 1});
+        classifier("gadisc.dat", learning, 24, {1}, {-0.5, 0.975, true, 1});
     }
 
     void head() {
@@ -345,7 +357,7 @@ private:
             out.add(x, 0);
         };
         Learning learning =
-            collect({"portraits/mtfl", "scenes/faces", "people/celeba", "people/lfw"}, mostSamples, use);
+            collect({"portraits/mtfl", "scenes/faces", "people/celeba", "people/lfw"}, 5000, use);
         const QuadraticRegression regression(learning.samples.features);
         for (const Target& target : targets) {
             double mean = 0;
@@ -355,7 +367,7 @@ private:
             mean /= static_cast<double>(learning.samples.size());
             for (float& value : learning.samples.targets) value -= static_cast<float>(mean);
             std::cout << target.file << ": " << learning.train << " samples, mean " << mean << "\n";
-            estimator(target.file, regression, learning, 8, {1, 3}, mean);
+            estimator(target.file, regression, learning, 8, {1}, mean);
         }
     }
 
@@ -396,7 +408,7 @@ private:
                 return bestBalance(values, targets).first;
             };
             const QuadraticFunction function = regression.reduced(
-                learning.trainIndices(), bestSolution(regression, learning, {0.3, 1}, quality), 24);
+                learning.trainIndices(), bestSolution(regression, learning, {0.5}, quality), 20);
             std::cout << "  reduced: "
                       << bestBalance(devValues(function, learning), devTargets(learning)).first << " on dev\n"
                       << std::flush;
@@ -405,7 +417,7 @@ private:
     }
 
     void gender() {
-        constexpr std::size_t mostLabelled = 10000, mostTaken = 5000;
+        constexpr std::size_t mostLabelled = 7500, mostTaken = 3500;
         const auto use = [](const PortraitSet& set, std::size_t i, FloatSamples& out) {
             constexpr double adult = 16;
             const auto years = Labelled::ageOf(set.rowOf(i));
@@ -472,7 +484,7 @@ private:
             return bestBalance(values, targets).first;
         };
         const QuadraticFunction function =
-            regression.reduced(all.trainIndices(), bestSolution(regression, all, {0.5, 1.5}, quality), 24);
+            regression.reduced(all.trainIndices(), bestSolution(regression, all, {1}, quality), 24);
         const std::vector<double> values = devValues(function, all);
         const auto [balance, threshold] = bestBalance(values, devTargets(all));
         std::cout << "  reduced: " << balance << " on dev\n" << std::flush;
@@ -490,7 +502,7 @@ private:
             if (set.samples[i].split != Split::train && *years > 80) return;
             out.add(set.features(K::age, i), std::min(static_cast<float>(*years), oldest), exact ? 1 : 0.6f);
         };
-        Learning learning = collect({"portraits/utkface", "portraits/fairface"}, 10500, use);
+        Learning learning = collect({"portraits/utkface", "portraits/fairface"}, 9000, use);
         double mean = 0;
         for (std::size_t i = 0; i < learning.train; ++i)
             mean += static_cast<double>(learning.samples.targets[i]) / static_cast<double>(learning.train);
@@ -502,8 +514,8 @@ private:
         };
         const std::vector<std::size_t> chosen = learning.trainIndices();
         constexpr double penalty = 1;
-        const QuadraticFunction primary = regression.reduced(
-            chosen, bestSolution(regression, learning, {penalty, 0.4}, quality), directions);
+        const QuadraticFunction primary =
+            regression.reduced(chosen, bestSolution(regression, learning, {penalty}, quality), directions);
         std::vector<double> values = devValues(primary, learning);
         std::cout << "  primary reduced: " << meanError(values, devTargets(learning)) << " on dev\n"
                   << std::flush;
@@ -601,7 +613,10 @@ private:
         const Cmp::Portrait::SpharTransformator transformator(model.data);
         std::list<FNVector<float>> coefficients;
         const auto use = [&](const PortraitSet& set, std::size_t i, FloatSamples& out) {
-            const auto uniform = uniformlyLit(set.rowOf(i));
+            // Frontal portraits of every kind are taken for well lit, with little weight.
+            const std::optional<bool> uniform = set.rowOf(i).number("pose") == 0.0
+                                                    ? std::optional<bool>(true)
+                                                    : Labelled::frontalLight(set.rowOf(i));
             if (!uniform) return;
             coefficients.push_back(transformator(lightingWindow(set.features(K::lighting, i))));
             out.add(coefficients.back().span(), *uniform ? 1.0f : -1.0f,
@@ -612,12 +627,13 @@ private:
         classifier("ludisc.dat", learning, 9, {0.1, 1, 10}, {0.75, 0.95, false, -1});
     }
 
-    static constexpr std::size_t mostSamples = 9000;
+    static constexpr std::size_t mostSamples = 7000;
 
     PortraitSources sources_;
     std::filesystem::path folder_;
     std::mt19937_64 random_;
-    std::map<std::string, PortraitSet> sets_;
+    std::map<std::string, PortraitSet> sets_; ///< of the present step
+    std::vector<K> wanted_;                   ///< by the present step
 };
 
 } // namespace

@@ -22,7 +22,7 @@ std::vector<float> conjugateGradients(const std::vector<float>& b, int steps, Mu
     const auto dot = [](const std::vector<float>& u, const std::vector<float>& v) {
         return std::inner_product(u.begin(), u.end(), v.begin(), 0.0);
     };
-    constexpr double goodEnough = 1e-10;
+    constexpr double goodEnough = 1e-8;
     std::vector<float> x(b.size(), 0.0f), residual = b, direction = b;
     double square = dot(residual, residual);
     const double limit = goodEnough * square;
@@ -102,7 +102,7 @@ double QuadraticRegression::kernel(double product) const {
 std::vector<float> QuadraticRegression::solve(const std::vector<std::size_t>& chosen,
                                               const std::vector<float>& targets,
                                               const std::vector<float>& weights, double penalty) const {
-    constexpr int steps = 200;
+    constexpr int steps = 80;
     const std::size_t m = chosen.size();
     std::vector<float> k(m * m), diagonal(m);
     for (std::size_t j = 0; j < m; ++j) {
@@ -140,7 +140,7 @@ QuadraticFunction QuadraticRegression::reduced(const std::vector<std::size_t>& c
                                                std::size_t directions) const {
     constexpr std::size_t more = 8;
     constexpr int rounds = 8;
-    constexpr double digits = 127;
+    constexpr double digits = 31;
     const auto d = static_cast<double>(d_);
     std::vector<float> duals(n_, 0.0f);
     for (std::size_t j = 0; j < chosen.size(); ++j) duals[chosen[j]] += solution[j];
@@ -207,7 +207,7 @@ QuadraticFunction QuadraticRegression::reduced(const std::vector<std::size_t>& c
 QuadraticFunction QuadraticRegression::linearFit(const std::vector<std::size_t>& chosen,
                                                  const std::vector<float>& targets,
                                                  const std::vector<float>& weights, double penalty) const {
-    constexpr int steps = 200;
+    constexpr int steps = 80;
     const std::size_t m = chosen.size();
     std::vector<float> k(m * m), diagonal(m);
     for (std::size_t j = 0; j < m; ++j) {
@@ -234,7 +234,7 @@ QuadraticFunction QuadraticRegression::linearFit(const std::vector<std::size_t>&
 
 Eye::FullPolynomialSvm machineOf(const QuadraticFunction& function, double gain, double shift,
                                  const std::string& name) {
-    constexpr double digits = 8191;
+    constexpr double digits = 4095;
     Eye::FullPolynomialSvm svm;
     svm.degree = 2;
     svm.constant = 1;

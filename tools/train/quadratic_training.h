@@ -47,7 +47,7 @@ public:
     double predict(const std::vector<std::size_t>& chosen, const std::vector<float>& solution,
                    std::size_t i) const;
 
-    /// The solution as a function of features, with the `directions` strongest of its quadratic part, in 8
+    /// The solution as a function of features, with the `directions` strongest of its quadratic part, in 6
     /// bits each.
     QuadraticFunction reduced(const std::vector<std::size_t>& chosen, const std::vector<float>& solution,
                               std::size_t directions) const;
