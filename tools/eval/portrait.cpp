@@ -162,8 +162,8 @@ Cmp::Face faceOfEye(const FNImage<float>& eye) {
 class Measurement {
 public:
     Measurement(const std::string& etc, const EyeDistances& eyeDistances)
-        : face_(makeFaceFinder(etc)), eyes_(makeEyesFinder(etc, "Tolerant")), analyzer_(makeAnalyzer(etc)),
-          eyeDistances_(eyeDistances) {}
+        : face_(Labelled::makeFaceFinder(etc)), eyes_(Labelled::makeEyesFinder(etc, "Tolerant")),
+          analyzer_(makeAnalyzer(etc)), eyeDistances_(eyeDistances) {}
 
     /// @return whether our finders found the face; nothing for a row without eyes
     std::optional<bool> judge(const Labelled::Row& row, PortraitReport& report) const {
