@@ -23,6 +23,7 @@ using Cmp::Portrait::Characteristics;
 enum QuestionIndex {
     frontal,
     uniformLight,
+    ordinaryLight,
     eyesOpen,
     eyeOpenByLids,
     gazeFrontal,
@@ -41,6 +42,7 @@ enum QuantityIndex { age, agePerRange, chin, earLeft, earRight };
 PortraitReport emptyReport() {
     return {{{"frontal, against yaw above 20 degrees", -0.42f},
              {"frontal light, against more than 45 degrees", 0.75f},
+             {"light of any frontal portrait", 0.75f},
              {"eyes open (pictures of eyes)", -0.67f},
              {"eye open (by the lids' points)", -0.67f},
              {"gaze frontal (by the iris)", 0.5f},
@@ -72,14 +74,18 @@ public:
     }
 
     void judge(const Labelled::Row& row, const FNImageReference& image) {
-        if (const auto pose = row.number("pose"))
+        if (const auto pose = row.number("pose")) {
             ask(frontal, -portrait_.deviationFromFrontalPose(), *pose == 0);
+            if (*pose == 0) ask(ordinaryLight, -portrait_.deviationFromUniformLighting(), true);
+        }
         if (const auto light = Labelled::frontalLight(row))
             ask(uniformLight, -portrait_.deviationFromUniformLighting(), *light);
         if (const std::string text = row.text("glasses"); !text.empty())
             ask(glasses, portrait_.glasses(), text == "1");
         judgePerson(row);
-        if (const auto points = Labelled::Points68::of(row)) judgePoints(row, *points, image);
+        // Pictures under one lamp have the points of others of the same person.
+        const auto points = Labelled::Points68::of(row);
+        if (points && !row.number("light_azimuth")) judgePoints(row, *points, image);
     }
 
 private:
