@@ -1,11 +1,11 @@
 #include "eval/portrait.h"
 
 #include "cmp/portrait/analyzer.h"
-#include "eval/finder_access.h"
 #include "fn/deployment/app_config_db.h"
 #include "fn/imagefile/image_file.h"
 #include "img/affine/transform.h"
 #include "img/affine/turns.h"
+#include "labelled/found_eyes.h"
 #include "labelled/portrait_truth.h"
 
 #include <nlohmann/json.hpp>
@@ -167,9 +167,7 @@ Cmp::Face faceOfEye(const FNImage<float>& eye) {
 
 class Measurement {
 public:
-    Measurement(const std::string& etc, const EyeDistances& eyeDistances)
-        : face_(makeFaceFinder(etc)), eyes_(makeEyesFinder(etc, "Tolerant")), analyzer_(makeAnalyzer(etc)),
-          eyeDistances_(eyeDistances) {}
+    explicit Measurement(const std::string& etc) : find_(etc), analyzer_(makeAnalyzer(etc)) {}
 
     /// @return whether our finders found the face; nothing for a row without eyes
     std::optional<bool> judge(const Labelled::Row& row, PortraitReport& report) const {
@@ -181,39 +179,16 @@ public:
         }
         const auto left = row.position("eye_left"), right = row.position("eye_right");
         if (!left || !right || !(left->x < right->x)) return {};
-        FacialFeatureLocation first{*left, 0, 0}, second{*right, 0, 0};
-        const bool found = find(image, first, second);
-        const Characteristics portrait = analyzer_.analyze(Cmp::Face(image, first, second));
+        const auto eyes = find_(image, *left, *right);
+        const Characteristics portrait =
+            analyzer_.analyze(Cmp::Face(image, {eyes.left, 0, 0}, {eyes.right, 0, 0}));
         Judge(portrait, report).judge(row, image);
-        return found;
+        return eyes.found;
     }
 
 private:
-    bool find(const FNImageReference& image, FacialFeatureLocation& left,
-              FacialFeatureLocation& right) const {
-        constexpr float mostOff = 0.25f;
-        const FaceTruth truth{left.pos, right.pos, {}, {}, "", true};
-        std::list<FaceFinder::Location> locations;
-        face_.find(image, locations, eyeDistances_.least, eyeDistances_.most, FaceFinder::everywhere);
-        for (const FaceFinder::Location& location : locations) {
-            if (!truth.meantBy(location)) continue;
-            bool foundFirst = false, foundSecond = false;
-            FacialFeatureLocation first, second;
-            eyes_.find(location, image, foundFirst, first, foundSecond, second);
-            const auto near = [&](FNPos a, FNPos b) { return length(a - b) < mostOff * truth.eyeDistance(); };
-            if (!foundFirst || !foundSecond || !near(first.pos, left.pos) || !near(second.pos, right.pos))
-                return false;
-            left = first;
-            right = second;
-            return true;
-        }
-        return false;
-    }
-
-    FaceFinder face_;
-    EyesFinder eyes_;
+    Labelled::EyesAsFound find_;
     Analyzer analyzer_;
-    EyeDistances eyeDistances_;
 };
 
 void addTo(PortraitReport& report, const PortraitReport& more) {
@@ -312,8 +287,7 @@ double Quantity::bias() const {
     return sum / static_cast<double>(std::max<std::size_t>(errors.size(), 1));
 }
 
-PortraitReports measurePortraits(const std::string& etc, const Selection& selection,
-                                 const EyeDistances& eyeDistances) {
+PortraitReports measurePortraits(const std::string& etc, const Labelled::Selection& selection) {
     std::vector<Labelled::Row> rows;
     for (const std::string& labels : selection.labels)
         for (const Labelled::Row& row : Labelled::readLabels(labels))
@@ -325,8 +299,8 @@ PortraitReports measurePortraits(const std::string& etc, const Selection& select
         std::string failure;
     };
     std::vector<Judged> judged(rows.size());
-    const Measurement measurement(etc, eyeDistances);
-    forEachOf(rows.size(), selection.jobs, [&](std::size_t i) {
+    const Measurement measurement(etc);
+    Labelled::forEachOf(rows.size(), selection.jobs, [&](std::size_t i) {
         try {
             judged[i].found = measurement.judge(rows[i], judged[i].report);
         } catch (const std::exception& e) {

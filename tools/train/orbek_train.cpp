@@ -2,6 +2,7 @@
 
 #include "fn/exception.h"
 #include "fn/numeric/blas.h"
+#include "train/b7_training.h"
 #include "train/calibration.h"
 #include "train/face_training.h"
 #include "train/feature_training.h"
@@ -62,6 +63,28 @@ int main(int argc, char** argv) {
         ->check(CLI::ExistingDirectory);
     portrait->add_option("--cache", cache, "Folder that keeps extracted features")->required();
     portrait->add_option("--only", only, "One step, such as age or mouth");
+    Train::B7Folders b7;
+    const auto b7Training = [&](const char* name, const char* doc,
+                                void (*task)(const Train::B7Folders&, std::uint64_t)) {
+        CLI::App* const sub = app.add_subcommand(name, doc);
+        sub->add_option("--data", b7.data, "Root of the labelled images")
+            ->required()
+            ->check(CLI::ExistingDirectory);
+        sub->add_option("--etc", b7.etc, "Folder of the finders' model files")
+            ->required()
+            ->check(CLI::ExistingDirectory);
+        sub->add_option("--cache", b7.cache, "Folder that keeps raw vectors, 1 GB")->required();
+        sub->add_option("--out", b7.out, "Folder of the files that are made")->required();
+        sub->add_option("--seed", seed, "Seed of all random choices")->capture_default_str();
+        sub->add_option("--threads", threads, "Threads of the linear algebra")->capture_default_str();
+        sub->callback([&, task] {
+            Fn::Numeric::setBlasThreads(threads);
+            task(b7, seed);
+        });
+    };
+    b7Training("b7", "The transformation and the mapping files of the B7 comparison", Train::trainB7);
+    b7Training("calibrate-b7", "The mapping files for a transformation of B7 that is there",
+               Train::calibrateB7);
     std::string scores, algorithm;
     CLI::App* const calibration = app.add_subcommand(
         "calibrate", "The score and rate mapping files of a comparison algorithm, from scores of pairs");
