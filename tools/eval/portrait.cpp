@@ -270,6 +270,7 @@ double Question::bestBalanced() const {
     std::sort(scores.begin(), scores.end());
     constexpr std::size_t steps = 200;
     double best = balanced();
+    if (count(true) == 0 || count(false) == 0) return best;
     for (std::size_t i = 0; i < steps && !scores.empty(); ++i)
         best = std::max(best, balancedAt(*this, scores[i * scores.size() / steps]));
     return best;

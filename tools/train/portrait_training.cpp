@@ -97,6 +97,14 @@ void save(const Eye::FullPolynomialSvm& svm, const std::filesystem::path& file) 
     if (!stream.flush()) FN_THROW(FNEIOError, file.string() + ": cannot be written");
 }
 
+/// What a penalty is chosen by, greater being better.
+double classification(const std::vector<double>& values, const std::vector<float>& targets) {
+    return bestBalance(values, targets).first;
+}
+double estimation(const std::vector<double>& values, const std::vector<float>& targets) {
+    return -meanError(values, targets);
+}
+
 /// How a classifier's scores are laid: this share of the good portraits passes at the threshold, and the
 /// median of the others lies at a place of its own.
 struct WorkingPoint {
@@ -212,11 +220,9 @@ private:
                     const std::vector<double>& penalties, const WorkingPoint& point) {
         std::cout << file << ": " << learning.train << " samples\n" << std::flush;
         const QuadraticRegression regression(learning.samples.features);
-        const auto quality = [](const std::vector<double>& values, const std::vector<float>& targets) {
-            return bestBalance(values, targets).first;
-        };
-        const QuadraticFunction function = regression.reduced(
-            learning.trainIndices(), bestSolution(regression, learning, penalties, quality), directions);
+        const QuadraticFunction function =
+            regression.reduced(learning.trainIndices(),
+                               bestSolution(regression, learning, penalties, classification), directions);
         lay(file, function, devValues(function, learning), devTargets(learning), point);
     }
 
@@ -342,8 +348,6 @@ private:
             {"learest.dat", [](const auto& e) { return e.left - 0.5f; }},
             {"rearest.dat", [](const auto& e) { return e.right + 0.5f; }},
         };
-        std::vector<Labelled::Points68::Extent> extents;
-        FloatSamples train, dev;
         const auto extentOf = [](const PortraitSet& set, std::size_t i) {
             const PortraitSample& sample = set.samples[i];
             auto extent = Labelled::Points68::of(set.rowOf(i))->extent(sample.leftEye, sample.rightEye);
@@ -375,11 +379,8 @@ private:
     /// A machine for the targets plus `mean`.
     void estimator(const std::string& file, const QuadraticRegression& regression, const Learning& learning,
                    std::size_t directions, const std::vector<double>& penalties, double mean) {
-        const auto quality = [](const std::vector<double>& values, const std::vector<float>& targets) {
-            return -meanError(values, targets);
-        };
         const QuadraticFunction function = regression.reduced(
-            learning.trainIndices(), bestSolution(regression, learning, penalties, quality), directions);
+            learning.trainIndices(), bestSolution(regression, learning, penalties, estimation), directions);
         std::cout << "  reduced: " << meanError(devValues(function, learning), devTargets(learning))
                   << " on dev\n"
                   << std::flush;
@@ -388,7 +389,6 @@ private:
 
     void ethnicity() {
         using Labelled::Ethnicity;
-        std::vector<Ethnicity> labels;
         std::map<const float*, Ethnicity> byFeatures;
         const auto use = [&](const PortraitSet& set, std::size_t i, FloatSamples& out) {
             const auto label = Labelled::ethnicityOf(set.rowOf(i));
@@ -405,11 +405,8 @@ private:
                 learning.samples.targets[i] =
                     byFeatures[learning.samples.features[i].data()] == group ? 1.0f : -1.0f;
             std::cout << file << ": " << learning.train << " samples\n";
-            const auto quality = [](const std::vector<double>& values, const std::vector<float>& targets) {
-                return bestBalance(values, targets).first;
-            };
             const QuadraticFunction function = regression.reduced(
-                learning.trainIndices(), bestSolution(regression, learning, {0.5}, quality), 20);
+                learning.trainIndices(), bestSolution(regression, learning, {0.5}, classification), 20);
             std::cout << "  reduced: "
                       << bestBalance(devValues(function, learning), devTargets(learning)).first << " on dev\n"
                       << std::flush;
@@ -481,11 +478,8 @@ private:
         balance(all.samples);
         std::cout << "  with " << taken.size() << " of known persons\n" << std::flush;
         const QuadraticRegression regression(all.samples.features);
-        const auto quality = [](const std::vector<double>& values, const std::vector<float>& targets) {
-            return bestBalance(values, targets).first;
-        };
         const QuadraticFunction function =
-            regression.reduced(all.trainIndices(), bestSolution(regression, all, {1}, quality), 24);
+            regression.reduced(all.trainIndices(), bestSolution(regression, all, {1}, classification), 24);
         const std::vector<double> values = devValues(function, all);
         const auto [balance, threshold] = bestBalance(values, devTargets(all));
         std::cout << "  reduced: " << balance << " on dev\n" << std::flush;
@@ -510,13 +504,10 @@ private:
         for (float& value : learning.samples.targets) value -= static_cast<float>(mean);
         std::cout << "age: " << learning.train << " samples, mean " << mean << "\n" << std::flush;
         const QuadraticRegression regression(learning.samples.features);
-        const auto quality = [](const std::vector<double>& values, const std::vector<float>& targets) {
-            return -meanError(values, targets);
-        };
         const std::vector<std::size_t> chosen = learning.trainIndices();
         constexpr double penalty = 1;
         const QuadraticFunction primary =
-            regression.reduced(chosen, bestSolution(regression, learning, {penalty}, quality), directions);
+            regression.reduced(chosen, bestSolution(regression, learning, {penalty}, estimation), directions);
         std::vector<double> values = devValues(primary, learning);
         std::cout << "  primary reduced: " << meanError(values, devTargets(learning)) << " on dev\n"
                   << std::flush;
