@@ -11,6 +11,7 @@
 #include <map>
 #include <numeric>
 #include <random>
+#include <utility>
 
 namespace Train {
 namespace {
@@ -25,8 +26,8 @@ constexpr std::size_t batch = 2048;               ///< samples whose products ar
 constexpr float shrinkage = 0.7f;                 ///< of the mean variance within a person, added to each
 constexpr float floorOfWeights = 2;               ///< in root mean squares of all weights
 constexpr std::size_t mostPicturesThatCount = 10; ///< of one person, for the scatter between persons
-constexpr std::uint32_t rank = 1000;              ///< of the correction to the diagonal
-constexpr double basisLevels = 12; ///< standard deviation of the weights of the basis as integers
+constexpr std::uint32_t rank = 600; ///< of the correction to the diagonal; 400 to 1000 score alike
+constexpr double basisLevels = 8;   ///< standard deviation of the weights of the basis as integers
 constexpr double mostLevel = 127, mostSquareLevel = 2047;
 /// Of raw scores of different people; see Cmp::B7::b7NormParams.
 constexpr double impostorDeviation = 4.04;
@@ -193,6 +194,15 @@ Groups groupsBy(const RawVectors& raw, const std::vector<std::size_t>& samples,
     return groups;
 }
 
+Groups setsOf(const RawVectors& raw, const std::vector<std::size_t>& samples) {
+    Groups groups;
+    for (std::size_t column = 0; column < samples.size(); ++column) {
+        const std::string& file = raw.item(samples[column]).file;
+        groups[file.substr(0, file.rfind('/'))].push_back(column);
+    }
+    return groups;
+}
+
 std::vector<float> meanOf(const Matrix<float>& columns, const std::vector<std::size_t>& members) {
     std::vector<float> mean(columns.rows());
     for (const std::size_t c : members)
@@ -213,6 +223,17 @@ SymmMatrix<float> withinPersons(const Matrix<float>& inner, const Groups& person
         samples += members.size();
     }
     return scatter.sum() * (1 / static_cast<float>(samples));
+}
+
+/// Adds the differences of the sets' means, so strongly that nothing of them is left after whitening: how
+/// pictures of a set were taken says nothing about a person.
+void addSets(const Matrix<float>& inner, const Groups& sets, SymmMatrix<float>& within) {
+    constexpr float strength = 100;
+    for (const auto& [name, members] : sets) {
+        std::vector<float> mean = meanOf(inner, members);
+        for (float& v : mean) v *= std::sqrt(strength);
+        within.addOuterProduct(FNVector<float>(mean));
+    }
 }
 
 /// The mean over persons of the products of different pictures.
@@ -259,13 +280,12 @@ void scaleColumns(Matrix<float>& m, const std::vector<float>& factors) {
 }
 
 /// The symmetric root of the metric.
-Matrix<float> metricRoot(SymmMatrix<float> within, const SymmMatrix<float>& between) {
+/// @param added to each variance within persons
+Matrix<float> metricRoot(SymmMatrix<float> within, const SymmMatrix<float>& between, float added) {
     const std::size_t n = within.size();
     Matrix<float> whitening(n, n);
     const FNVector<float> variances = Fn::eigenVectorsLowMem(within, whitening, true);
-    std::cout << "  variance within persons: " << variances.sum() << '\n' << std::flush;
     const Matrix<float> directions = whitening;
-    const float added = shrinkage * static_cast<float>(variances.sum()) / static_cast<float>(n);
     std::vector<float> factors(n);
     std::ranges::transform(variances, factors.begin(), [&](float v) { return 1 / std::sqrt(v + added); });
     scaleColumns(whitening, factors);
@@ -364,9 +384,15 @@ B7Factors learnProjection(const RawVectors& raw) {
 
     std::map<std::string, std::string> personOfPicture;
     for (const std::size_t s : named) personOfPicture[raw.item(s).file] = raw.item(s).person;
+    SymmMatrix<float> within = withinPersons(inner, groupsBy(raw, named, &RawVectors::Item::person));
+    float variance = 0;
+    for (std::size_t i = 0; i < components; ++i) variance += std::as_const(within)(i, i);
+    std::cout << "  variance within persons: " << variance << '\n' << std::flush;
+    addSets(inner, setsOf(raw, named), within);
+    const SymmMatrix<float> between =
+        betweenPersons(inner, groupsBy(raw, named, &RawVectors::Item::file), personOfPicture);
     const Matrix<float> root =
-        metricRoot(withinPersons(inner, groupsBy(raw, named, &RawVectors::Item::person)),
-                   betweenPersons(inner, groupsBy(raw, named, &RawVectors::Item::file), personOfPicture));
+        metricRoot(within, between, shrinkage * variance / static_cast<float>(components));
 
     std::vector<float> variances(components);
     for (std::size_t c = 0; c < inner.cols(); ++c)

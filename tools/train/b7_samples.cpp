@@ -167,22 +167,22 @@ Extracted extract(const Extraction& extraction, const Source& source, std::uint6
 
 } // namespace
 
-RawVectors::RawVectors(const std::filesystem::path& data, const std::filesystem::path& etc,
-                       const std::filesystem::path& cache, std::uint64_t seed)
+RawVectors::RawVectors(const TrainingSources& sources)
     : dimension_(Cmp::B7::PreProcessor::computeFeatureVectorSize()) {
-    const std::filesystem::path valueFile = cache / "b7-raw.bin", itemFile = cache / "b7-raw.tsv";
+    const std::filesystem::path valueFile = sources.cache / "b7-raw.bin",
+                                itemFile = sources.cache / "b7-raw.tsv";
     if (!std::filesystem::exists(itemFile)) {
-        std::filesystem::create_directories(cache);
-        const std::vector<Source> sources = sourcesBelow(data);
-        const Extraction extraction(etc);
+        std::filesystem::create_directories(sources.cache);
+        const std::vector<Source> pictures = sourcesBelow(sources.data);
+        const Extraction extraction(sources.etc);
         std::ofstream values(valueFile, std::ios::binary);
         std::ostringstream items;
         // In blocks, so that the order is that of the sources whatever thread was first.
         constexpr std::size_t block = 500;
-        for (std::size_t begin = 0; begin < sources.size(); begin += block) {
-            std::vector<Extracted> extracted(std::min(block, sources.size() - begin));
+        for (std::size_t begin = 0; begin < pictures.size(); begin += block) {
+            std::vector<Extracted> extracted(std::min(block, pictures.size() - begin));
             Labelled::forEachOf(extracted.size(), std::thread::hardware_concurrency(), [&](std::size_t i) {
-                extracted[i] = extract(extraction, sources[begin + i], seed);
+                extracted[i] = extract(extraction, pictures[begin + i], sources.seed);
             });
             for (const Extracted& e : extracted)
                 for (const auto& [item, digits] : e.variants) {
@@ -191,14 +191,15 @@ RawVectors::RawVectors(const std::filesystem::path& data, const std::filesystem:
                     values.write(reinterpret_cast<const char*>(digits.data()),
                                  static_cast<std::streamsize>(digits.size()));
                 }
-            std::cout << "  raw vectors of " << begin + extracted.size() << " of " << sources.size()
+            std::cout << "  raw vectors of " << begin + extracted.size() << " of " << pictures.size()
                       << " pictures\n"
                       << std::flush;
         }
         values.close();
         std::ofstream list(itemFile);
         list << items.str();
-        if (!values || !list.flush()) FN_THROW(FNEIOError, "Cannot write raw vectors to " + cache.string());
+        if (!values || !list.flush())
+            FN_THROW(FNEIOError, "Cannot write raw vectors to " + sources.cache.string());
     }
     std::ifstream list(itemFile), values(valueFile, std::ios::binary);
     std::string line;

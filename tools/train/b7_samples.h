@@ -1,9 +1,9 @@
 #pragma once
 
 #include "labelled/labels.h"
+#include "train/training_sources.h"
 
 #include <cstdint>
-#include <filesystem>
 #include <optional>
 #include <span>
 #include <string>
@@ -34,10 +34,8 @@ public:
     /// those of named people in the train part, the first one of all others, those of unnamed people only of
     /// the train part.
     ///
-    /// They are kept in `cache` (two files, 1 GB) and read from there if they are there.
-    /// @param etc folder of the finders' model files
-    RawVectors(const std::filesystem::path& data, const std::filesystem::path& etc,
-               const std::filesystem::path& cache, std::uint64_t seed);
+    /// They are kept in `sources.cache` (two files, 1 GB) and read from there if they are there.
+    explicit RawVectors(const TrainingSources& sources);
 
     std::size_t size() const { return items_.size(); }
     const Item& item(std::size_t i) const { return items_[i]; }

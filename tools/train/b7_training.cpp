@@ -106,23 +106,23 @@ void calibrate(const RawVectors& raw, const Cmp::B7::Transformation& transformat
 
 } // namespace
 
-void trainB7(const B7Folders& folders, std::uint64_t seed) {
-    std::filesystem::create_directories(folders.out);
-    const RawVectors raw(folders.data, folders.etc, folders.cache, seed);
+void trainB7(const TrainingSources& sources, const std::filesystem::path& folder) {
+    std::filesystem::create_directories(folder);
+    const RawVectors raw(sources);
     std::cout << raw.size() << " raw vectors\n" << std::flush;
     const Orbek::Models::B7Factors factors = learnProjection(raw);
-    writeFactors(factors, folders.out / factorsFile);
+    writeFactors(factors, folder / factorsFile);
     const Cmp::B7::Transformation transformation = factors.unpack();
-    transformation.write((folders.out / transformationFile).string());
-    calibrate(raw, transformation, folders.out);
+    transformation.write((folder / transformationFile).string());
+    calibrate(raw, transformation, folder);
 }
 
-void calibrateB7(const B7Folders& folders, std::uint64_t seed) {
-    const RawVectors raw(folders.data, folders.etc, folders.cache, seed);
+void calibrateB7(const TrainingSources& sources, const std::filesystem::path& folder) {
+    const RawVectors raw(sources);
     calibrate(raw,
-              Cmp::B7::Transformation::read((folders.out / transformationFile).string(), raw.dimension(),
+              Cmp::B7::Transformation::read((folder / transformationFile).string(), raw.dimension(),
                                             Cmp::B7::Encoder().components()),
-              folders.out);
+              folder);
 }
 
 } // namespace Train

@@ -54,37 +54,23 @@ int main(int argc, char** argv) {
     measure->callback([&] { Train::measureSynth(data, samples); });
     training("l5", "The transformation and the mapping files of the L5 comparison", Train::trainL5);
     std::string etc, cache, only;
-    CLI::App* const portrait =
-        training("portrait", "The files of the portrait analyser", [&](const auto&...) {
-            Train::trainPortrait({data, etc, cache, seed}, folder, only);
+    const auto cached = [&](const char* name, const char* doc, auto task) {
+        CLI::App* const sub = training(name, doc, [&, task](const auto&...) {
+            task(Train::TrainingSources{data, etc, cache, seed}, folder);
         });
-    portrait->add_option("--etc", etc, "Unpacked models of the finders")
-        ->required()
-        ->check(CLI::ExistingDirectory);
-    portrait->add_option("--cache", cache, "Folder that keeps extracted features")->required();
-    portrait->add_option("--only", only, "One step, such as age or mouth");
-    Train::B7Folders b7;
-    const auto b7Training = [&](const char* name, const char* doc,
-                                void (*task)(const Train::B7Folders&, std::uint64_t)) {
-        CLI::App* const sub = app.add_subcommand(name, doc);
-        sub->add_option("--data", b7.data, "Root of the labelled images")
+        sub->add_option("--etc", etc, "Unpacked models of the finders")
             ->required()
             ->check(CLI::ExistingDirectory);
-        sub->add_option("--etc", b7.etc, "Folder of the finders' model files")
-            ->required()
-            ->check(CLI::ExistingDirectory);
-        sub->add_option("--cache", b7.cache, "Folder that keeps raw vectors, 1 GB")->required();
-        sub->add_option("--out", b7.out, "Folder of the files that are made")->required();
-        sub->add_option("--seed", seed, "Seed of all random choices")->capture_default_str();
-        sub->add_option("--threads", threads, "Threads of the linear algebra")->capture_default_str();
-        sub->callback([&, task] {
-            Fn::Numeric::setBlasThreads(threads);
-            task(b7, seed);
-        });
+        sub->add_option("--cache", cache, "Folder that keeps extracted features")->required();
+        return sub;
     };
-    b7Training("b7", "The transformation and the mapping files of the B7 comparison", Train::trainB7);
-    b7Training("calibrate-b7", "The mapping files for a transformation of B7 that is there",
-               Train::calibrateB7);
+    cached("portrait", "The files of the portrait analyser",
+           [&](const Train::TrainingSources& sources, const Path& out) {
+               Train::trainPortrait(sources, out, only);
+           })
+        ->add_option("--only", only, "One step, such as age or mouth");
+    cached("b7", "The transformation and the mapping files of the B7 comparison", Train::trainB7);
+    cached("calibrate-b7", "The mapping files for a transformation of B7 that is there", Train::calibrateB7);
     std::string scores, algorithm;
     CLI::App* const calibration = app.add_subcommand(
         "calibrate", "The score and rate mapping files of a comparison algorithm, from scores of pairs");

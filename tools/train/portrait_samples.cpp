@@ -128,7 +128,7 @@ template <class T> T readNumber(std::istream& stream) {
 /// Fills sets, from the cache where it has them.
 class PortraitSampler {
 public:
-    explicit PortraitSampler(const PortraitSources& sources, const std::string& folder)
+    explicit PortraitSampler(const TrainingSources& sources, const std::string& folder)
         : sources_(sources), folder_(folder), features_(FNMutex()), random_(sources.seed) {
         std::filesystem::create_directories(sources.cache);
         set_.rows = Labelled::readLabels(sources.data / folder / "labels.tsv");
@@ -287,7 +287,7 @@ private:
         }
     }
 
-    PortraitSources sources_;
+    TrainingSources sources_;
     std::string folder_;
     PortraitFeatures features_;
     Random random_;
@@ -304,13 +304,13 @@ std::size_t PortraitSet::dimension(PortraitKind kind) const {
     return columns == columns_.end() ? 0 : columns->second.dimension;
 }
 
-PortraitSet loadPortraits(const PortraitSources& sources, const std::string& folder,
+PortraitSet loadPortraits(const TrainingSources& sources, const std::string& folder,
                           const std::vector<PortraitKind>& kinds, const std::vector<PortraitKind>& wanted,
                           std::size_t most) {
     return PortraitSampler(sources, folder).faces(kinds, wanted, most);
 }
 
-PortraitSet loadEyePictures(const PortraitSources& sources, const std::string& folder) {
+PortraitSet loadEyePictures(const TrainingSources& sources, const std::string& folder) {
     return PortraitSampler(sources, folder).eyePictures();
 }
 

@@ -2,6 +2,7 @@
 
 #include "cmp/portrait/portrait_features.h"
 #include "labelled/labels.h"
+#include "train/training_sources.h"
 
 #include <filesystem>
 #include <map>
@@ -61,23 +62,15 @@ private:
     std::map<PortraitKind, Columns> columns_;
 };
 
-/// Where the samples come from and are kept.
-struct PortraitSources {
-    std::filesystem::path data;  ///< root of the labelled images
-    std::filesystem::path etc;   ///< unpacked models of the finders
-    std::filesystem::path cache; ///< keeps extracted features
-    std::uint64_t seed = 1;
-};
-
 /// The set in a folder below the data. @param kinds all that are ever extracted of it
 /// @param wanted those of them that are returned
 /// @param most rows at most, the others being left out evenly
-PortraitSet loadPortraits(const PortraitSources& sources, const std::string& folder,
+PortraitSet loadPortraits(const TrainingSources& sources, const std::string& folder,
                           const std::vector<PortraitKind>& kinds, const std::vector<PortraitKind>& wanted,
                           std::size_t most = 1000000);
 
 /// Vectors of single eyes, from pictures of one eye each; the same interface, kind closedEyes only. The eye
 /// is taken to be as large as it is on average.
-PortraitSet loadEyePictures(const PortraitSources& sources, const std::string& folder);
+PortraitSet loadEyePictures(const TrainingSources& sources, const std::string& folder);
 
 } // namespace Train

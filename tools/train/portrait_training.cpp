@@ -115,7 +115,7 @@ struct WorkingPoint {
 
 class PortraitTraining {
 public:
-    PortraitTraining(const PortraitSources& sources, const std::filesystem::path& folder)
+    PortraitTraining(const TrainingSources& sources, const std::filesystem::path& folder)
         : sources_(sources), folder_(folder), random_(sources.seed) {}
 
     void run(const std::string& only) {
@@ -633,7 +633,7 @@ private:
 
     static constexpr std::size_t mostSamples = 7000;
 
-    PortraitSources sources_;
+    TrainingSources sources_;
     std::filesystem::path folder_;
     std::mt19937_64 random_;
     std::map<std::string, PortraitSet> sets_; ///< of the present step
@@ -642,7 +642,7 @@ private:
 
 } // namespace
 
-void trainPortrait(const PortraitSources& sources, const std::filesystem::path& folder,
+void trainPortrait(const TrainingSources& sources, const std::filesystem::path& folder,
                    const std::string& only) {
     std::filesystem::create_directories(folder);
     PortraitTraining(sources, folder).run(only);
