@@ -144,10 +144,16 @@ Fn::InvertibleFunction<float, float> Calibration::tabulate() const {
         FN_THROW(FNEBadArg, "Calibration: genuine scores are not higher than impostor scores");
     // Where the scores are far apart, the places change their order; then the table lies between them.
     const auto [low, high] = std::minmax({frr_.placeOf(logSmallestRate), far_.placeOf(logSmallestRate)});
-    const double anchor =
+    const double middle =
         logRatio(placeWhere([&](double raw) { return -logFar(raw); }, -std::log(farOfMiddle), low, high));
+    // The ends move a little with the anchor, and the stretched middle with them.
+    double anchor = middle, first = 0, last = 1;
     const auto scoreOf = [&](double raw) { return logistic(logRatio(raw) - anchor); };
-    const double first = scoreOf(low), last = scoreOf(high);
+    for (int i = 0; i < 20; ++i) {
+        first = scoreOf(low);
+        last = scoreOf(high);
+        anchor = middle - scoreSlope * std::log((first + last) / (2 - first - last));
+    }
     std::vector<float> values(samples);
     for (int i = 0; i < samples; ++i) {
         const double score = scoreOf(low + (high - low) * i / (samples - 1));
