@@ -39,8 +39,8 @@ private:
     FNCountedPtr<FNImageSequence> sequence_;
 };
 
-/// Takes frames from a source, on a thread that lives as long as this, from the first start() on. A source that
-/// fails ends the thread and with it all sequences.
+/// Takes frames from a source, on a thread that lives as long as this, from the first start() on. A source
+/// that fails ends the thread and with it all sequences.
 class FNImageSequenceFactory {
 public:
     /// @param source gives a fresh reference for each frame, which gets the time as its attribute
