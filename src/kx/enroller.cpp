@@ -15,7 +15,7 @@ void SampleDataCollector::remove(int index) {
 }
 
 bool Enroller::pushSample(int index, const Cmp::Face& face) {
-    return push(index, Cmp::Sample(face.image(), face.leftEye(), face.rightEye()), face.image());
+    return push(index, Cmp::Sample{face.image(), face.leftEye(), face.rightEye()}, face.image());
 }
 
 bool Enroller::pushSample(int index, const SensorSample& sample) {

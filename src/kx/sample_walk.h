@@ -79,8 +79,8 @@ bool walk(const Operation& operation, const std::list<Cmp::Face>& faces, Use use
     for (const Cmp::Face& face : faces) {
         const FNImageReference image = cachingIntensity(face.image());
         operation.broadcast(OperationInterest::ProcessingSample{index, image});
-        const SensorSample sample(image, face.leftEyeLocation(), face.rightEyeLocation());
-        tellEyes(operation, sample, index);
+        const SensorSample sample{image, face.leftEyeLocation(), face.rightEyeLocation()};
+        operation.broadcast(OperationInterest::EyesFound{index, *sample.leftEye, *sample.rightEye});
         if (use(sample, index)) return true;
         ++index;
     }

@@ -9,7 +9,7 @@
 #include "fn/video_source.h"
 #include "kx/events.h"
 
-#include <array>
+#include <atomic>
 #include <cmath>
 #include <sstream>
 #include <vector>
@@ -42,7 +42,7 @@ constexpr FacialFeatureLocation leftEye{{1, 2}, 0, 0.5f}, rightEye{{3, 2}, 0, 0.
 /// Time that passes only when somebody lets it.
 class TestClock final : public FNRealTime::Clock {
 public:
-    double seconds() const override { return static_cast<double>(now_) / 1000; }
+    double seconds() const override { return static_cast<double>(now_.load()) / 1000; }
     void sleep(unsigned int milliseconds) const override {
         slept.push_back(milliseconds);
         pass(milliseconds);
@@ -52,7 +52,7 @@ public:
     mutable std::vector<unsigned int> slept;
 
 private:
-    mutable long now_ = 5000; // milliseconds
+    mutable std::atomic<long> now_ = 5000; // milliseconds
 };
 
 class Faces final : public FaceFinder::Body {
