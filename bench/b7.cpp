@@ -71,17 +71,20 @@ void rank(benchmark::State& state, bool plain) {
 BENCHMARK_CAPTURE(rank, plain, true)->Unit(benchmark::kMillisecond);
 BENCHMARK_CAPTURE(rank, fast, false)->Unit(benchmark::kMillisecond);
 
-void project(benchmark::State& state) {
-    std::mt19937 random(1);
+/// The integers of the projection.
+void project(benchmark::State& state, bool plain) {
+    std::minstd_rand random(1);
     Fn::Matrix<signed char> m(20608, 5912);
     std::generate_n(m.getExclusive(), m.size(), [&] { return static_cast<signed char>(random()); });
-    FNVector<float> v(20604);
-    std::generate_n(v.getExclusive(), v.size(), [&] { return static_cast<float>(random() % 1000); });
-    const FNVector<float> base(5912, 0.0f);
-    for (auto _ : state) benchmark::DoNotOptimize(Cmp::multiplyDigitized(v, m, 1.0f, base));
+    FNVector<short> v(20608);
+    std::generate_n(v.getExclusive(), v.size(), [&] { return static_cast<short>(random() % 1000); });
+    const Cmp::FPMatVecMultiplier multiplier;
+    for (auto _ : state)
+        benchmark::DoNotOptimize(plain ? multiplier.leftMultiplyPlain(v, m) : multiplier.leftMultiply(v, m));
     state.SetBytesProcessed(state.iterations() * static_cast<std::int64_t>(m.size()));
 }
-BENCHMARK(project)->Unit(benchmark::kMillisecond);
+BENCHMARK_CAPTURE(project, plain, true)->Unit(benchmark::kMillisecond);
+BENCHMARK_CAPTURE(project, fast, false)->Unit(benchmark::kMillisecond);
 
 void decode(benchmark::State& state) {
     const Encoder encoder;
@@ -110,5 +113,21 @@ void products(benchmark::State& state, int pairs) {
 }
 BENCHMARK_CAPTURE(products, one, 1)->Unit(benchmark::kMicrosecond);
 BENCHMARK_CAPTURE(products, four, 4)->Unit(benchmark::kMicrosecond);
+
+/// The same from packed features, with 1 and 5 others.
+void packedProducts(benchmark::State& state) {
+    const Encoder encoder;
+    const auto bytes = encoder.createEncodedType();
+    const unsigned char* const packed = bytes.data() + Encoder::headerSize;
+    const std::vector<PackedProducts::Probe> probes(static_cast<std::size_t>(state.range(0)),
+                                                    encoder.packedProducts().prepare(packed));
+    std::vector<PackedProducts::Sums> sums(probes.size());
+    for (auto _ : state) {
+        encoder.packedProducts().sums(packed, probes, sums.data());
+        benchmark::DoNotOptimize(sums.data());
+    }
+    state.SetItemsProcessed(state.iterations() * state.range(0));
+}
+BENCHMARK(packedProducts)->Arg(1)->Arg(5)->Unit(benchmark::kMicrosecond);
 
 } // namespace

@@ -1,13 +1,13 @@
 // Finding faces, eyes, mouth and nose bridge on photos of 640 by 480 pixels, one thread. The photos are those
 // named by ORBEK_PHOTOS, a folder with labels.tsv.
 
-#include "eval/finder_access.h"
-#include "eval/pictures.h"
 #include "eval/yardsticks.h"
 #include "fn/image_reference.h"
 #include "fn/image_representation.h"
 #include "fn/imagefile/image_file.h"
 #include "img/affine/transform.h"
+#include "labelled/finder_access.h"
+#include "labelled/pictures.h"
 
 #include <benchmark/benchmark.h>
 
@@ -38,10 +38,10 @@ const std::vector<FNImageReference>& photos() {
     static const std::vector<FNImageReference> all = [] {
         const char* const folder = std::getenv("ORBEK_PHOTOS");
         if (!folder) throw std::runtime_error("ORBEK_PHOTOS names no folder with labels.tsv");
-        Eval::Selection selection;
+        Labelled::Selection selection;
         selection.labels = {std::string(folder) + "/labels.tsv"};
         std::vector<FNImageReference> images;
-        const auto pictures = Eval::picturesOf(selection);
+        const auto pictures = Labelled::picturesOf(selection);
         const std::size_t step = std::max<std::size_t>(pictures.size() / mostPhotos, 1);
         for (std::size_t i = 0; i < pictures.size() && images.size() < mostPhotos; i += step)
             images.push_back(framed(Fn::readImage(pictures[i].file.string())));
@@ -62,13 +62,13 @@ void find(benchmark::State& state, const FaceFinder& finder) {
 }
 
 void findFaces(benchmark::State& state) {
-    find(state, Eval::makeFaceFinder(etc));
+    find(state, Labelled::makeFaceFinder(etc));
 }
 BENCHMARK(findFaces)->Unit(benchmark::kMillisecond);
 
 /// The same photo again and again, as of a camera before which little moves.
 void findFacesInStream(benchmark::State& state) {
-    const FaceFinder finder = Eval::makeFaceFinder(etc);
+    const FaceFinder finder = Labelled::makeFaceFinder(etc);
     const std::vector<FNImageReference>& images = photos();
     constexpr int frames = 30;
     std::list<FaceFinder::Location> faces;
@@ -83,10 +83,10 @@ void findFacesInStream(benchmark::State& state) {
 BENCHMARK(findFacesInStream)->Unit(benchmark::kMillisecond);
 
 void findFeaturesOfAFace(benchmark::State& state) {
-    const FaceFinder finder = Eval::makeFaceFinder(etc);
-    const EyesFinder eyes = Eval::makeEyesFinder(etc, "Strict");
-    const MouthFinder mouth = Eval::makeMouthFinder(etc);
-    const BridgeFinder bridge = Eval::makeBridgeFinder(etc);
+    const FaceFinder finder = Labelled::makeFaceFinder(etc);
+    const EyesFinder eyes = Labelled::makeEyesFinder(etc, "Strict");
+    const MouthFinder mouth = Labelled::makeMouthFinder(etc);
+    const BridgeFinder bridge = Labelled::makeBridgeFinder(etc);
     std::vector<std::pair<FNImageReference, FaceFinder::Location>> found;
     for (const FNImageReference& image : photos()) {
         std::list<FaceFinder::Location> faces;
@@ -110,10 +110,10 @@ BENCHMARK(findFeaturesOfAFace)->Unit(benchmark::kMillisecond);
 
 void constructAllFinders(benchmark::State& state) {
     for (auto _ : state) {
-        benchmark::DoNotOptimize(Eval::makeFaceFinder(etc));
-        benchmark::DoNotOptimize(Eval::makeEyesFinder(etc, "Strict"));
-        benchmark::DoNotOptimize(Eval::makeMouthFinder(etc));
-        benchmark::DoNotOptimize(Eval::makeBridgeFinder(etc));
+        benchmark::DoNotOptimize(Labelled::makeFaceFinder(etc));
+        benchmark::DoNotOptimize(Labelled::makeEyesFinder(etc, "Strict"));
+        benchmark::DoNotOptimize(Labelled::makeMouthFinder(etc));
+        benchmark::DoNotOptimize(Labelled::makeBridgeFinder(etc));
     }
 }
 BENCHMARK(constructAllFinders)->Unit(benchmark::kMillisecond);

@@ -19,6 +19,8 @@ public:
     unsigned int count() const { return count_; }
     unsigned int bits() const { return bits_; }
     float factor() const { return factor_; }
+    /// Words are odd multiples of this. For up to 5 bits.
+    short wordOffset() const { return wordTable_[1u << (bits_ - 1)]; }
     std::size_t size() const; ///< in bytes
 
     /// Codes are floor(x * 2^(bits - 1) / factor), cut to their range.

@@ -12,6 +12,7 @@
 ///         void load(std::size_t slot, const Record&);      // slot < itemsAtOnce()
 ///         void compare(std::span<GalleryIterator::Item>);  // fills the scores of the loaded ones
 ///         const std::vector<ScoreHistogram>* distributions() const;
+///         void expect(const Record&);                      // may have: of the next ones, the first
 ///     };
 
 namespace Cmp::Implementation {
@@ -36,11 +37,16 @@ public:
             partition_ = *partition;
             next_ = partition_.begin;
         }
+        const auto& all = partition_.records->items();
         for (; loaded_ < items_.size() && next_ < partition_.end; ++loaded_, ++next_) {
-            const auto& item = partition_.records->items()[next_];
-            items_[loaded_].id = item.id;
-            comparer_.load(loaded_, *item.record);
+            items_[loaded_].id = all[next_].id;
+            comparer_.load(loaded_, *all[next_].record);
+            // What tells where the features of a record are must be there before they are asked for.
+            constexpr std::size_t ahead = 6;
+            if (partition_.end - next_ > ahead) __builtin_prefetch(all[next_ + ahead].record);
         }
+        if constexpr (requires(Comparer & c, const typename Comparer::Record& r) { c.expect(r); })
+            if (next_ < partition_.end) comparer_.expect(*all[next_].record);
         return loaded_;
     }
 
@@ -92,8 +98,14 @@ std::list<GalleryIterator> walkGallery(const Fn::View<Population>::Iterator& pop
     if (partitions == 0) FN_THROW(FNEBadArg, module + ": Number of partitions has to be >= 1");
     using Iterator = FeatureSetsIterator<Comparer>;
     using Body = FNCountedPtr<GalleryIterator::Body>;
-    const FNCountedPtr<typename Iterator::Source> source(new
-                                                         typename Iterator::Source(populations, partitions));
+    // All are looked at before any is compared: a search ends with all results or with none.
+    std::list<Population> all;
+    for (Fn::View<Population>::Iterator next = populations; !next.atEnd(); ++next) {
+        all.push_back(*next);
+        (void)dynamic_cast<const FeatureSets<typename Comparer::Record>&>(*all.back().body());
+    }
+    const FNCountedPtr<typename Iterator::Source> source(
+        new typename Iterator::Source(Fn::View<Population>(all).begin(), partitions));
     std::list<GalleryIterator> iterators;
     for (unsigned int i = 0; i < partitions; ++i)
         if (const auto first = source->getPartition())

@@ -32,8 +32,8 @@ DigitizedVector::DigitizedVector(FNVector<float> const& v, std::size_t size) : d
     std::fill(out + v.size(), out + size, short{0});
 }
 
-FNVector<int> FPMatVecMultiplier::leftMultiply(FNVector<short> const& v,
-                                               Fn::Matrix<signed char> const& m) const {
+FNVector<int> FPMatVecMultiplier::leftMultiplyPlain(FNVector<short> const& v,
+                                                    Fn::Matrix<signed char> const& m) const {
     if (v.size() != m.rows()) FN_THROW(FNEBadArg, "Invalid Size for digitized vector");
     FNVector<int> products(m.cols());
     int* const out = products.getExclusive();

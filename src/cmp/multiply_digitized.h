@@ -22,6 +22,8 @@ struct FPMatVecMultiplier {
     /// The product of `v` with each column, summed exactly, and then cut to 32 bits.
     /// @throws FNEBadArg for a matrix of another number of rows
     FNVector<int> leftMultiply(FNVector<short> const& v, Fn::Matrix<signed char> const& m) const;
+    /// The same column by column.
+    FNVector<int> leftMultiplyPlain(FNVector<short> const& v, Fn::Matrix<signed char> const& m) const;
 };
 
 /// About v * (m * factor), in integers.

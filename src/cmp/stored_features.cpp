@@ -53,8 +53,8 @@ void unpackFeature(const RecordForm& form, const Fn::Package& package, unsigned 
     const auto words = reader.next<Words>();
     reader.expectEnd();
     if (words.size() != form.words)
-        FN_THROW(FNEBadArg, form.module + ": loadFeatureSet: incompatible data: feature of " +
-                                std::to_string(words.size()) + " words instead of " +
+        FN_THROW(FNEBadArg, form.module + ": loadFeatureSet: incompatible data: " + form.label +
+                                ": feature of " + std::to_string(words.size()) + " words instead of " +
                                 std::to_string(form.words));
     if (form.words != 0) std::memcpy(memory, words.get(), form.words * 4);
 }
@@ -74,7 +74,8 @@ std::string labelOf(const RecordForm& form) {
     return form.label + "::RefSet";
 }
 
-StoredFeatures::Block read(const RecordForm& form, const Fn::Package& package) {
+/// Features back to back.
+std::vector<unsigned char> read(const RecordForm& form, const Fn::Package& package) {
     const std::list<Fn::Package> all = children(form, package);
     const auto label = Fn::deSerialize<std::string>(all.front());
     if (label != labelOf(form))
@@ -85,28 +86,30 @@ StoredFeatures::Block read(const RecordForm& form, const Fn::Package& package) {
         features.resize(features.size() + form.featureSize());
         unpackFeature(form, *feature, features.data() + features.size() - form.featureSize());
     }
-    StoredFeatures::Block block(features.size());
-    std::ranges::copy(features, block.getExclusive());
-    return block;
-}
-
-StoredFeatures::Block borrow(const RecordForm& form, unsigned char*& memory) {
-    std::uint32_t count = 0;
-    std::memcpy(&count, memory, sizeof count);
-    const std::size_t size = count * form.featureSize();
-    const unsigned char* const features = memory + sizeof count;
-    memory += sizeof count + size;
-    if (size == 0) return {};
-    return StoredFeatures::Block(features, size, FNRMemCoreBody::preserve(), false);
+    return features;
 }
 
 } // namespace
 
 StoredFeatures::StoredFeatures(const Form& form, const Fn::Package& package)
-    : StoredFeatures(form, read(*form, package)) {}
+    : form_(form), features_(nullptr), count_(0), owns_(true) {
+    const std::vector<unsigned char> features = read(*form, package);
+    if (features.empty()) return;
+    auto* const block = new unsigned char[features.size()];
+    std::ranges::copy(features, block);
+    features_ = block;
+    count_ = static_cast<std::uint32_t>(features.size() / featureSize());
+}
 
 StoredFeatures::StoredFeatures(const Form& form, unsigned char*& memory)
-    : StoredFeatures(form, borrow(*form, memory)) {}
+    : form_(form), features_(memory + sizeof count_), count_(0), owns_(false) {
+    std::memcpy(&count_, memory, sizeof count_);
+    memory += mementoSize();
+}
+
+StoredFeatures::~StoredFeatures() {
+    if (owns_) delete[] features_;
+}
 
 Fn::Package StoredFeatures::serialize() const {
     std::list<Fn::Package> elements{Fn::serialize(labelOf(*form_))};
@@ -115,9 +118,8 @@ Fn::Package StoredFeatures::serialize() const {
 }
 
 void StoredFeatures::createMemento(unsigned char*& memory) const {
-    const auto features = static_cast<std::uint32_t>(count());
-    std::memcpy(memory, &features, sizeof features);
-    if (features_.size() != 0) std::memcpy(memory + sizeof features, features_.data(), features_.size());
+    std::memcpy(memory, &count_, sizeof count_);
+    if (count_ != 0) std::memcpy(memory + sizeof count_, features_, size());
     memory += mementoSize();
 }
 

@@ -3,7 +3,8 @@
 #include "cmp/fir.h"
 #include "fn/serialize.h"
 
-#include <span>
+#include <cstdint>
+#include <memory>
 #include <vector>
 
 namespace Cmp::Implementation {
@@ -29,27 +30,37 @@ struct RecordForm {
 class StoredFeatures : public FIR::Body {
 public:
     using Form = FNCountedPtr<const RecordForm>;
-    using Block = FNRMem<unsigned char>;
+    using Block = std::unique_ptr<unsigned char[]>;
 
-    /// @param features a whole number of features
-    StoredFeatures(const Form& form, const Block& features) : form_(form), features_(features) {}
+    /// @param features so many, back to back
+    StoredFeatures(const Form& form, Block features, std::size_t count)
+        : form_(form), features_(features.release()), count_(static_cast<std::uint32_t>(count)), owns_(true) {
+    }
     /// @throws FNEBadArg for another label, or features that do not have the form
     StoredFeatures(const Form& form, const Fn::Package& package);
     /// The flat form at `memory`, which is moved behind it and must outlive this.
     StoredFeatures(const Form& form, unsigned char*& memory);
+    ~StoredFeatures() override;
+    StoredFeatures(const StoredFeatures&) = delete;
+    StoredFeatures& operator=(const StoredFeatures&) = delete;
 
     Fn::Package serialize() const override;
     void createMemento(unsigned char*& memory) const override;
-    std::size_t mementoSize() const override { return 4 + features_.size(); }
+    std::size_t mementoSize() const override { return 4 + size(); }
     std::string version() const override { return form_->label; }
 
-    std::size_t count() const { return features_.size() / form_->featureSize(); }
-    std::size_t featureSize() const { return form_->featureSize(); }
-    const unsigned char* feature(std::size_t i) const { return features_.data() + i * form_->featureSize(); }
+    std::size_t count() const { return count_; }
+    std::size_t featureSize() const { return form_.get()->featureSize(); }
+    const unsigned char* feature(std::size_t i) const { return features_ + i * featureSize(); }
 
 private:
+    std::size_t size() const { return count_ * featureSize(); }
+
+    // A gallery has very many of these: not a byte more than it takes.
     Form form_;
-    Block features_;
+    const unsigned char* features_;
+    std::uint32_t count_;
+    bool owns_; ///< whether the features are deleted with this
 };
 
 /// The records of one generation, which cannot be taken for those of another.

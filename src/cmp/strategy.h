@@ -8,7 +8,8 @@ namespace Cmp {
 /// A comparison algorithm with its mappings and a number of threads: what compares records. A plain value;
 /// may be used by any number of threads.
 ///
-///     for (const Cmp::Match& match : *strategy.compare({{probe, Cmp::Score(0.6f), 10}}, people).front())
+///     const auto results = strategy.compare({{probe, Cmp::Score(0.6f), 10}}, people);
+///     for (const Cmp::Match& match : *results.front())
 ///         std::cout << match.id << "\n";
 class Strategy {
 public:

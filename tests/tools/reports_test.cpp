@@ -72,7 +72,7 @@ protected:
     const std::list<FaceFinder::Location> reports_ = {
         {{20, 52}, 22, 0.9f, 0}, {{120, 50}, 40, 0.5f, 0}, {{400, 50}, 20, 0.1f, 0}};
     ScratchFolder scratch_;
-    Eval::Selection selection_;
+    Labelled::Selection selection_;
 };
 
 TEST_F(Reports, DetectionCountsTheFacesThatAreAskedFor) {

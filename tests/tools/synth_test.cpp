@@ -1,7 +1,7 @@
-#include "eval/finder_access.h"
-#include "eval/pictures.h"
 #include "eval/yardsticks.h"
 #include "fn/imagefile/image_file.h"
+#include "labelled/finder_access.h"
+#include "labelled/pictures.h"
 #include "small_portrait_model.h"
 #include "support/scratch_folder.h"
 #include "support/thrown.h"
@@ -139,10 +139,10 @@ TEST(PortraitWithModels, ControlsMoveTheLandmarksTheyAreNamedAfter) {
 /// Of the sample pictures of this repository.
 const std::string sampleLabels = std::string(ORBEK_SOURCE_DIR) + "/examples/images/labels.tsv";
 
-std::vector<Eval::LabelledPicture> samples() {
-    Eval::Selection selection;
+std::vector<Labelled::Picture> samples() {
+    Labelled::Selection selection;
     selection.labels = {sampleLabels};
-    return Eval::picturesOf(selection);
+    return Labelled::picturesOf(selection);
 }
 
 TEST(SynthSamples, AMirrorImageHasTheOtherSideOfEverything) {
@@ -202,7 +202,7 @@ TEST(HairRemoval, ReplacesOnTheForeheadWhatIsNoSkin) {
     EXPECT_NEAR(meanOver(fringe, -1, 0.2f), before, 0.05f * before) << "and leaves the face alone";
 }
 
-bool findsTheOneFace(const FaceFinder& finder, const Eval::LabelledPicture& picture) {
+bool findsTheOneFace(const FaceFinder& finder, const Labelled::Picture& picture) {
     std::list<FaceFinder::Location> faces;
     finder.find(Fn::readImage(picture.file.string()), faces, 0.1, 0.5, FaceFinder::everywhere);
     return !faces.empty() && picture.faces.front().meantBy(faces.front());
@@ -210,11 +210,11 @@ bool findsTheOneFace(const FaceFinder& finder, const Eval::LabelledPicture& pict
 
 TEST(SamplePicturesWithModels, FaceAndEyesAreFoundInEach) {
     const fs::path etc = fs::path(ORBEK_BINARY_DIR) / "etc";
-    const FaceFinder finder = Eval::makeFaceFinder(etc);
-    const EyesFinder eyesFinder = Eval::makeEyesFinder(etc, "Strict");
+    const FaceFinder finder = Labelled::makeFaceFinder(etc);
+    const EyesFinder eyesFinder = Labelled::makeEyesFinder(etc, "Strict");
     const auto pictures = samples();
     ASSERT_GE(pictures.size(), 32u);
-    for (const Eval::LabelledPicture& picture : pictures) {
+    for (const Labelled::Picture& picture : pictures) {
         const FNImageReference image = Fn::readImage(picture.file.string());
         EXPECT_GE(image.w(), 300u);
         EXPECT_GE(image.h(), 400u);
@@ -225,7 +225,7 @@ TEST(SamplePicturesWithModels, FaceAndEyesAreFoundInEach) {
         FacialFeatureLocation first, second;
         eyesFinder.find(faces.front(), image, foundFirst, first, foundSecond, second);
         ASSERT_TRUE(foundFirst && foundSecond) << picture.file;
-        const Eval::FaceTruth& truth = picture.faces.front();
+        const Labelled::FaceTruth& truth = picture.faces.front();
         if (first.pos.x > second.pos.x) std::swap(first, second);
         const float worst = std::max(length(first.pos - truth.leftEye), length(second.pos - truth.rightEye));
         EXPECT_LT(worst, 0.1f * truth.eyeDistance()) << picture.file;
@@ -236,7 +236,7 @@ TEST(SamplePictures, OtherDetectorsFindTheFaceInEach) {
     if (Eval::yardstickNames().empty()) GTEST_SKIP() << "built without ORBEK_YARDSTICKS";
     for (const std::string& name : Eval::yardstickNames()) {
         const FaceFinder finder = *Eval::makeYardstick(name);
-        for (const Eval::LabelledPicture& picture : samples())
+        for (const Labelled::Picture& picture : samples())
             EXPECT_TRUE(findsTheOneFace(finder, picture)) << name << ", " << picture.file;
     }
 }

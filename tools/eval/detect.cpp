@@ -13,7 +13,7 @@ namespace Eval {
 namespace {
 
 DetectedPicture judge(const FaceFinder& finder, const EyeDistances& eyeDistances,
-                      const LabelledPicture& picture) {
+                      const Labelled::Picture& picture) {
     DetectedPicture result;
     result.file = picture.file.string();
     std::list<FaceFinder::Location> reports;
@@ -24,7 +24,7 @@ DetectedPicture judge(const FaceFinder& finder, const EyeDistances& eyeDistances
         result.failure = e.what();
         return result;
     }
-    for (const FaceTruth& truth : picture.faces) {
+    for (const Labelled::FaceTruth& truth : picture.faces) {
         DetectedPicture::Face face{truth.eyeDistance(), {}, truth.group};
         const auto hit = std::find_if(reports.begin(), reports.end(),
                                       [&](const auto& report) { return truth.meantBy(report); });
@@ -50,12 +50,12 @@ struct Share {
 
 } // namespace
 
-std::vector<DetectedPicture> detect(const FaceFinder& finder, const Selection& selection,
+std::vector<DetectedPicture> detect(const FaceFinder& finder, const Labelled::Selection& selection,
                                     const EyeDistances& eyeDistances) {
-    const std::vector<LabelledPicture> pictures = picturesOf(selection);
+    const std::vector<Labelled::Picture> pictures = Labelled::picturesOf(selection);
     std::vector<DetectedPicture> results(pictures.size());
-    forEachOf(pictures.size(), selection.jobs,
-              [&](std::size_t i) { results[i] = judge(finder, eyeDistances, pictures[i]); });
+    Labelled::forEachOf(pictures.size(), selection.jobs,
+                        [&](std::size_t i) { results[i] = judge(finder, eyeDistances, pictures[i]); });
     return results;
 }
 

@@ -1,6 +1,6 @@
 #pragma once
 
-#include "eval/pictures.h"
+#include "labelled/pictures.h"
 
 #include <optional>
 #include <ostream>
@@ -30,7 +30,7 @@ struct DetectedPicture {
 };
 
 /// Runs the finder over all pictures.
-std::vector<DetectedPicture> detect(const FaceFinder& finder, const Selection& selection,
+std::vector<DetectedPicture> detect(const FaceFinder& finder, const Labelled::Selection& selection,
                                     const EyeDistances& eyeDistances);
 
 /// One line of the table: what holds for reports of at least this confidence.

@@ -17,7 +17,7 @@ struct Measured {
     bool faceFound = false, looked = false;
     std::optional<std::pair<FNPos, FNPos>> eyes; ///< found less labelled, eye distances
     std::optional<float> mouth, bridge;
-    const FaceTruth* truth = nullptr;
+    const Labelled::FaceTruth* truth = nullptr;
 };
 
 template <class Finder>
@@ -30,7 +30,7 @@ std::optional<float> errorOf(const Finder& finder, const std::optional<FNPos>& l
 }
 
 Measured measure(const LandmarkFinders& finders, const FNImageReference& image,
-                 const std::list<FaceFinder::Location>& reports, const FaceTruth& truth) {
+                 const std::list<FaceFinder::Location>& reports, const Labelled::FaceTruth& truth) {
     Measured result;
     result.truth = &truth;
     const auto hit = std::find_if(reports.begin(), reports.end(),
@@ -76,17 +76,17 @@ float LandmarkErrors::quantile(double share) const {
     return errors[static_cast<std::size_t>(share * static_cast<double>(errors.size() - 1))];
 }
 
-LandmarkReport measureLandmarks(const LandmarkFinders& finders, const Selection& selection,
+LandmarkReport measureLandmarks(const LandmarkFinders& finders, const Labelled::Selection& selection,
                                 const EyeDistances& eyeDistances) {
-    const std::vector<LabelledPicture> pictures = picturesOf(selection);
+    const std::vector<Labelled::Picture> pictures = Labelled::picturesOf(selection);
     std::vector<std::vector<Measured>> measured(pictures.size());
     std::vector<std::string> failures(pictures.size());
-    forEachOf(pictures.size(), selection.jobs, [&](std::size_t i) {
+    Labelled::forEachOf(pictures.size(), selection.jobs, [&](std::size_t i) {
         try {
             const FNImageReference image = Fn::readImage(pictures[i].file.string());
             std::list<FaceFinder::Location> reports;
             finders.face.find(image, reports, eyeDistances.least, eyeDistances.most, FaceFinder::everywhere);
-            for (const FaceTruth& truth : pictures[i].faces)
+            for (const Labelled::FaceTruth& truth : pictures[i].faces)
                 if (truth.counts) measured[i].push_back(measure(finders, image, reports, truth));
         } catch (const std::exception& e) {
             failures[i] = pictures[i].file.string() + ": " + e.what();

@@ -46,7 +46,7 @@ struct LandmarkReport {
     std::vector<std::string> failures; ///< pictures that could not be read, and why
 };
 
-LandmarkReport measureLandmarks(const LandmarkFinders& finders, const Selection& selection,
+LandmarkReport measureLandmarks(const LandmarkFinders& finders, const Labelled::Selection& selection,
                                 const EyeDistances& eyeDistances);
 
 void printLandmarks(const LandmarkReport& report, std::ostream& stream);

@@ -2,11 +2,11 @@
 // be read.
 
 #include "eval/detect.h"
-#include "eval/finder_access.h"
 #include "eval/landmarks.h"
 #include "eval/plot.h"
 #include "eval/yardsticks.h"
 #include "fn/exception.h"
+#include "labelled/finder_access.h"
 
 #include <CLI/CLI.hpp>
 
@@ -17,7 +17,7 @@ namespace {
 
 /// What all reports take.
 struct Options {
-    Eval::Selection selection;
+    Labelled::Selection selection;
     Eval::EyeDistances eyeDistances;
     std::string etc, finder = "orbek", settings = "Strict", json, plot;
 };
@@ -34,7 +34,7 @@ int statusOf(const std::vector<std::string>& failures) {
 
 int detect(const Options& options) {
     const std::optional<FaceFinder> yardstick = Eval::makeYardstick(options.finder);
-    const FaceFinder finder = yardstick ? *yardstick : Eval::makeFaceFinder(options.etc);
+    const FaceFinder finder = yardstick ? *yardstick : Labelled::makeFaceFinder(options.etc);
     const auto pictures = Eval::detect(finder, options.selection, options.eyeDistances);
     Eval::printDetection(pictures, std::cout);
     if (!options.json.empty()) writeFile(options.json, Eval::detectionJson(pictures));
@@ -53,8 +53,8 @@ int detect(const Options& options) {
 
 int eyes(const Options& options) {
     const Eval::LandmarkFinders finders{
-        Eval::makeFaceFinder(options.etc), Eval::makeEyesFinder(options.etc, options.settings),
-        Eval::makeMouthFinder(options.etc), Eval::makeBridgeFinder(options.etc)};
+        Labelled::makeFaceFinder(options.etc), Labelled::makeEyesFinder(options.etc, options.settings),
+        Labelled::makeMouthFinder(options.etc), Labelled::makeBridgeFinder(options.etc)};
     const Eval::LandmarkReport report =
         Eval::measureLandmarks(finders, options.selection, options.eyeDistances);
     Eval::printLandmarks(report, std::cout);
@@ -76,7 +76,7 @@ int eyes(const Options& options) {
 
 CLI::App* report(CLI::App& app, const char* name, const char* doc, Options& options) {
     CLI::App* const command = app.add_subcommand(name, doc);
-    Eval::Selection& selection = options.selection;
+    Labelled::Selection& selection = options.selection;
     command->add_option("--labels", selection.labels, "Label files; image paths are relative to them")
         ->required()
         ->check(CLI::ExistingFile);

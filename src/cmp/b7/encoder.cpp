@@ -24,8 +24,6 @@ constexpr struct {
     {3, 150, 0.48f}, {3, 140, 0.47f}, {3, 220, 0.46f}, {3, 80, 0.45f},  {3, 580, 0.44f}, {3, 270, 0.43f},
     {3, 10, 0.42f},  {3, 310, 0.41f}, {3, 230, 0.39f}, {3, 470, 0.38f}, {3, 74, 0.35f}};
 
-constexpr std::size_t headerSize = 3 * sizeof(float);
-
 /// Of the words of a group.
 constexpr std::size_t padded(std::size_t n) {
     return (n + 7) >> 3 << 3;
@@ -40,6 +38,7 @@ Encoder::Encoder() {
         components_ += block.count;
     }
     blocks_ = collector.finalizeRegistration(groups_);
+    products_.emplace(blocks_);
     encodedSize_ = headerSize;
     for (const auto& block : blocks_) encodedSize_ += block->size();
     for (const Group& group : groups_) words_ += padded(group.first);
@@ -92,6 +91,20 @@ void Encoder::decode(const unsigned char* encoded, short* words) const {
         }
         while (words < begin + padded(group.first)) *words++ = 0;
     }
+}
+
+float Encoder::product(const PackedProducts::Sums& sums) const {
+    double total = 0;
+    for (std::size_t g = 0; g < groups_.size(); ++g)
+        total += static_cast<double>(sums[g]) * groups_[g].second;
+    return static_cast<float>(total);
+}
+
+float Encoder::productByGroups(const PackedProducts::Sums& sums) const {
+    float total = 0;
+    for (std::size_t g = 0; g < groups_.size(); ++g)
+        total += static_cast<float>(static_cast<double>(sums[g]) * groups_[g].second);
+    return total;
 }
 
 float Encoder::wordDotProduct(const short* a, const short* b) const {

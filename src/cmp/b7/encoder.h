@@ -1,7 +1,9 @@
 #pragma once
 
-#include "cmp/encoding.h"
+#include "cmp/b7/packed_products.h"
 #include "fn/vector.h"
+
+#include <optional>
 
 namespace Cmp::B7 {
 
@@ -52,6 +54,13 @@ public:
 
     const std::vector<Group>& groups() const { return groups_; }
 
+    /// Bytes of an encoded feature before the blocks, which are what packedProducts() takes.
+    static constexpr std::size_t headerSize = 3 * sizeof(float);
+    const PackedProducts& packedProducts() const { return *products_; }
+    /// The scalar product of two features from their sums: rounded once, and group by group.
+    float product(const PackedProducts::Sums& sums) const;
+    float productByGroups(const PackedProducts::Sums& sums) const;
+
     /// The scalar product of two features, from their words.
     float wordDotProduct(const short* a, const short* b) const;
     /// a * b, a * c
@@ -62,6 +71,7 @@ public:
 private:
     Implementation::ComponentBlockCollector::Blocks blocks_;
     std::vector<Group> groups_;
+    std::optional<PackedProducts> products_;
     std::size_t components_ = 0, words_ = 0, encodedSize_ = 0;
 };
 

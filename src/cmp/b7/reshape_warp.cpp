@@ -4,7 +4,9 @@
 #include "fn/shape.h"
 #include "img/affine/transform.h"
 
+#include <array>
 #include <cmath>
+#include <vector>
 
 namespace Cmp::B7 {
 
@@ -107,16 +109,25 @@ double mean(std::span<const float> row, double a, double b) {
     return ((ca - a) * first + sumOf(row, ca, fb) + (b - fb) * sumOf(row, fb, fb + 1)) / (b - a);
 }
 
-/// Share of the columns from a to b that is in none of the segments of the line.
-double padding(const Fn::Shape& inside, std::int32_t y, double a, double b) {
+/// Columns of one row that lie in the image.
+using Segments = std::vector<std::pair<double, double>>;
+
+Segments segmentsOf(const Fn::Shape& inside, std::uint32_t y) {
+    Segments segments;
+    for (Fn::ShapeLineIter i(inside, static_cast<std::int32_t>(y)); !i.atEnd(); ++i)
+        segments.emplace_back(i->x0, i->x1);
+    return segments;
+}
+
+/// Share of the columns from a to b that is in none of the segments.
+double padding(const Segments& inside, double a, double b) {
     const bool single = std::floor(b) < std::ceil(a) || a == b;
     if (single) {
         a = std::ceil(a) - 1;
         b = a + 1;
     }
     double covered = 0;
-    for (Fn::ShapeLineIter i(inside, y); !i.atEnd(); ++i)
-        covered += std::max(0.0, std::min<double>(b, i->x1) - std::max<double>(a, i->x0));
+    for (const auto& [begin, end] : inside) covered += std::max(0.0, std::min(b, end) - std::max(a, begin));
     return 1 - covered / (b - a);
 }
 
@@ -130,17 +141,20 @@ FNImage<float> reshapeWarp(FNImage<float> const& image, FNPos const& leftEye, FN
     FNImage<float> result(warpedSize, warpedSize);
     float* out = result.getExclusive();
     double outside = 0;
+    std::array<double, warpedSize + 1> borders;
+    for (std::uint32_t x = 0; x <= warpedSize; ++x) borders[x] = unrolling.column(x);
     for (std::uint32_t y = 0; y < warpedSize; ++y) {
         const std::span<const float> row(strip.pixels.row(y), strip.pixels.w());
+        const Segments inside = segmentsOf(strip.inside, y);
         const double start = unrolling.row(y);
         for (std::uint32_t x = 0; x < warpedSize; ++x, ++out) {
-            const double a = unrolling.column(x) + start, b = unrolling.column(x + 1) + start;
+            const double a = borders[x] + start, b = borders[x + 1] + start;
             if (b < a) {
                 *out = 0;
                 continue;
             }
             *out = static_cast<float>(mean(row, a, b));
-            outside += padding(strip.inside, static_cast<std::int32_t>(y), a, b);
+            outside += padding(inside, a, b);
         }
     }
     paddingRatio = static_cast<float>(outside / result.size());

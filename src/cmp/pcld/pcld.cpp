@@ -1,6 +1,7 @@
 #include "cmp/pcld/pcld.h"
 
 #include "cmp/clustering.h"
+#include "cmp/encoded_records.h"
 #include "cmp/gallery_walk.h"
 #include "cmp/pcld/rank_tables.h"
 #include "cmp/reshape.h"
@@ -8,13 +9,14 @@
 
 #include <cmath>
 #include <functional>
+#include <memory>
 #include <numbers>
 
 namespace Cmp::Implementation {
 
 using Pcld::FloatingPointFeature;
 using Features = std::vector<FloatingPointFeature>;
-using Record = FeatureSet<PCLD>;
+using Records = EncodedRecords<PCLD, Pcld::Encoder>;
 
 namespace {
 
@@ -69,7 +71,6 @@ public:
                                                })),
           maxNumberOfClusters_(std::max(settings.maxNumberOfClusters, 1)) {
         if (settings.encoding != "FloatEncoding") FN_THROW(FNEBadArg, "Encoder not known.");
-        encoder_ = FNCountedPtr<const Pcld::Encoder>(new Pcld::FloatEncoder(transformation_->matrix.cols()));
         if (!settings.isotropisationFile.empty())
             isotropisation_ =
                 isotropisationData_.get(settings.isotropisationFile, Pcld::readIsotropisationData);
@@ -77,13 +78,14 @@ public:
         form.label = settings.firVersion + " " + preprocessor_->algorithmName() + settings.strategyName;
         form.module = module;
         form.header.assign(3, RecordForm::Field::Float);
-        form.words = encoder_->components();
-        form_ = StoredFeatures::Form(new RecordForm(form));
+        const FNCountedPtr<const Pcld::Encoder> encoder(
+            new Pcld::FloatEncoder(transformation_->matrix.cols()));
+        records_ = std::make_unique<const Records>(form, encoder);
     }
 
-    const std::string& label() const { return form_->label; }
+    const Records& records() const { return *records_; }
+    const Pcld::Encoder& encoder() const { return records_->encoder(); }
     const MappingFiles& mappings() const { return mappings_; }
-    const Pcld::Encoder& encoder() const { return *encoder_; }
 
     FNVector<float> processSample(const FNImageReference& image, FNPos left, FNPos right) const {
         return (*transformation_)((*preprocessor_)(l5Face(image, left, right)));
@@ -101,49 +103,29 @@ public:
         for (const Cluster& c :
              cluster<Cluster>(features, static_cast<std::size_t>(maxNumberOfClusters_), makeFeature))
             centres.push_back(c.centre());
-        return encode(centres);
+        return records_->encode(centres);
     }
     FIR largestRecord() const {
-        return encode(Features(static_cast<std::size_t>(maxNumberOfClusters_), encoder_->createRawType()));
+        return records_->encode(
+            Features(static_cast<std::size_t>(maxNumberOfClusters_), encoder().createRawType()));
     }
-    FIR readRecord(const Fn::Package& package) const { return fir(new Record(form_, package)); }
-    FIR readRecord(unsigned char*& memory) const { return fir(new Record(form_, memory)); }
+    FIR readRecord(const Fn::Package& package) const { return records_->read(package); }
+    FIR readRecord(unsigned char*& memory) const { return records_->read(memory); }
 
     /// Appends the features of a record. @throws std::bad_cast, FNEBadArg for a record that is not of this
     /// algorithm
     void decode(const FIR& record, Features& features) const {
-        const auto& stored = dynamic_cast<const Record&>(*record.body());
-        const std::size_t first = features.size();
-        for (std::size_t i = 0; i < stored.count(); ++i) features.push_back(encoder_->createRawType());
-        decode(stored, features.data() + first);
-    }
-    /// @param features record.count() features from the encoder
-    void decode(const Record& record, Feature* features) const {
-        if (record.featureSize() != encoder_->mementoSize())
-            FN_THROW(FNEBadArg, "PCLD: record of another length of features");
-        for (std::size_t i = 0; i < record.count(); ++i) encoder_->decode(record.feature(i), features[i]);
+        records_->decode(record, encoder().createRawType(), features);
     }
 
 private:
-    FIR encode(const Features& features) const {
-        StoredFeatures::Block block(features.size() * encoder_->mementoSize());
-        unsigned char* memory = block.getExclusive();
-        for (const Feature& feature : features) {
-            encoder_->encode(feature, memory);
-            memory += encoder_->mementoSize();
-        }
-        return fir(new Record(form_, block));
-    }
-    static FIR fir(Record* record) { return FIR(FNCountedPtr<FIR::Body>(record)); }
-
     SharedFiles<Pcld::Transformation> transformations_;
     SharedFiles<Pcld::IsotropisationData> isotropisationData_;
     FNCountedPtr<const Pcld::Preprocessor> preprocessor_;
     MappingFiles mappings_;
     FNCountedPtr<const Pcld::Transformation> transformation_;
     FNCountedPtr<const Pcld::IsotropisationData> isotropisation_; ///< null for none
-    FNCountedPtr<const Pcld::Encoder> encoder_;
-    StoredFeatures::Form form_;
+    std::unique_ptr<const Records> records_;
     int maxNumberOfClusters_;
 };
 
@@ -152,7 +134,7 @@ namespace {
 /// One record at a time against all probes.
 class Comparer {
 public:
-    using Record = Implementation::Record;
+    using Record = Records::Record;
     using Core = PCLD::Core;
     using Probes = FNCountedPtr<const std::vector<Features>>;
 
@@ -160,9 +142,9 @@ public:
 
     std::size_t itemsAtOnce() const { return 1; }
     void load(std::size_t, const Record& record) {
-        count_ = record.count();
+        count_ = core_->records().demandSize(record).count();
         while (features_.size() < count_) features_.push_back(core_->encoder().createRawType());
-        core_->decode(record, features_.data());
+        for (std::size_t i = 0; i < count_; ++i) core_->encoder().decode(record.feature(i), features_[i]);
     }
     void compare(std::span<GalleryIterator::Item> items) {
         Pcld::score(*probes_, features_, count_, items.front().scores);
@@ -183,7 +165,7 @@ PCLD::PCLD(const PCLD&) = default;
 PCLD::~PCLD() = default;
 
 std::string PCLD::name() const {
-    return core_->label();
+    return core_->records().label();
 }
 
 RecordBuilder PCLD::createRecordBuilder() const {
@@ -208,7 +190,7 @@ float PCLD::one2one(const FIR& first, const FIR& second) const {
 }
 
 Population PCLD::createPopulation(unsigned int capacity) const {
-    return Population(FNCountedPtr<Population::Body>(new FeatureSets<Record>(capacity)));
+    return Population(FNCountedPtr<Population::Body>(new FeatureSets<Records::Record>(capacity)));
 }
 
 std::list<GalleryIterator> PCLD::prepareFew2Many(const std::vector<FIR>& probes,

@@ -1,5 +1,7 @@
 #include "orbek/implementation/orbek_properties.h"
 
+#include "cmp/b7/cmp_algorithm.h"
+#include "cmp/portrait/analyzer.h"
 #include "eye/cara/face_finder.h"
 #include "eye/ojo/eyes_finder.h"
 #include "eye/tracker/reference_face_tracker.h"
@@ -16,18 +18,6 @@ namespace {
 Property pending(const std::string& name, const std::string& typeId, const std::string& doc) {
     return Property(Type(typeId, doc, "", false), name, "", doc, false);
 }
-
-struct ComparisonAlgorithms {
-    static std::string typeId() { return "ComparisonAlgorithms"; }
-    static Type define() {
-        return Type(typeId(), "Available comparison algorithms",
-                    properties(pending("B7", "Cmp::B7::CmpAlgorithm", "B7 Comparison Algorithm"),
-                               pending("B6", "Cmp::B6::CmpAlgorithm", "B6 Comparison Algorithm"),
-                               pending("A14", "Cmp::A14::CmpAlgorithm", "A14 Comparison Algorithm"),
-                               pending("B6L5", "Cmp::Implementation::B6L5", "B6L5 Comparison Algorithm")),
-                    "", false);
-    }
-};
 
 struct ComparisonModule {
     static std::string typeId() { return "ComparisonModule"; }
@@ -63,7 +53,7 @@ std::list<Property> members() {
         pending("SetVerifier", "Kx::SetRecognizer", "Set Verifier"),
         pending("SetIdentifier", "Kx::SetIdentifier", "Set Identifier"),
         property<Eye::ReferenceFaceTracker>::create("FaceTracker", "Face Tracker Engine"),
-        pending("PortraitAnalyzer", "Cmp::Portrait::Analyzer", "Portrait Analyzer"),
+        property<Cmp::Portrait::Analyzer>::create("PortraitAnalyzer", "Portrait Analyzer"),
         pending("ISOFullFrontalTest", "Kx::ISO_19794_5::FullFrontal::Test",
                 "ISO 19794-5 Full Frontal images assessment"),
         pending("FeatureTest", "Kx::Feature::Test", "Portrait feature assessment"),
@@ -99,6 +89,15 @@ std::list<Default> imposedDefaults() {
 }
 
 } // namespace
+
+Type ComparisonAlgorithms::define() {
+    return Type(typeId(), "Available comparison algorithms",
+                properties(property<Cmp::B7::CmpAlgorithm>::create("B7", "B7 Comparison Algorithm"),
+                           pending("B6", "Cmp::B6::CmpAlgorithm", "B6 Comparison Algorithm"),
+                           pending("A14", "Cmp::A14::CmpAlgorithm", "A14 Comparison Algorithm"),
+                           pending("B6L5", "Cmp::Implementation::B6L5", "B6L5 Comparison Algorithm")),
+                "", false);
+}
 
 Type ORBEKProperties::define() {
     return Type(typeId(), "Tessarin SDK Resources", members(), imposedDefaults(), "", false);

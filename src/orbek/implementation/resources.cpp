@@ -1,7 +1,9 @@
 #include "orbek/implementation/resources.h"
 
+#include "cmp/b7/cmp_algorithm.h"
 #include "eye/cara/face_finder.h"
 #include "eye/ojo/eyes_finder.h"
+#include "fn/deployment/composite_values.h"
 #include "fn/message/translator.h"
 #include "orbek/implementation/orbek_properties.h"
 
@@ -30,6 +32,29 @@ EyesFinder Resources::eyesFinder() const {
     return EyesFinder(eyesFinder_.get(mutex_, FNTrans("Eyes finder"), [&] {
         return new Eye::Ojo::T8::EyesFinder(rootComponent_.subComponent("EyesFinder"));
     }));
+}
+
+namespace {
+
+Cmp::Strategy* makeStrategy(const Component& module) {
+    const int threads =
+        Fn::Deployment::Value<Fn::Deployment::Int>::get(module.subComponent("NumberOfThreads"));
+    const Component choice = module.subComponent("AlgorithmVersion");
+    const auto version =
+        Fn::Deployment::Value<Fn::Deployment::Alternative<ComparisonAlgorithms>>::get(choice);
+    if (version != "B7") FN_THROW(FNEBadArg, "Illegal value for Comparison Algorithm");
+    const FNCountedPtr<Cmp::B7::CmpAlgorithm> algorithm(
+        new Cmp::B7::CmpAlgorithm(choice.subComponent(version)));
+    return new Cmp::Strategy(algorithm, algorithm->scoreMapping(), algorithm->ratesMapping(),
+                             static_cast<unsigned int>(std::max(threads, 0)));
+}
+
+} // namespace
+
+Cmp::Strategy Resources::cmpStrategy() const {
+    return *cmpStrategy_.get(mutex_, FNTrans("Comparison module"), [&] {
+        return makeStrategy(rootComponent_.subComponent("ComparisonAlgorithm"));
+    });
 }
 
 FNCountedPtr<FG::DllFrameGrabberFactoryCache> Resources::dllFrameGrabberFactoryCache() const {

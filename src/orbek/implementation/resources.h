@@ -1,5 +1,6 @@
 #pragma once
 
+#include "cmp/strategy.h"
 #include "eye/eyes_finder.h"
 #include "eye/face_finder.h"
 #include "fg/dll_frame_grabber_factory.h"
@@ -44,6 +45,8 @@ public:
     /// @throws FNEGeneric "<engine> : <reason>" if one cannot be made
     FaceFinder faceFinder() const;
     EyesFinder eyesFinder() const;
+    /// The algorithm that `AlgorithmVersion` names, with its mappings.
+    Cmp::Strategy cmpStrategy() const;
     /// The plug-ins of capture devices.
     FNCountedPtr<FG::DllFrameGrabberFactoryCache> dllFrameGrabberFactoryCache() const;
 
@@ -54,6 +57,7 @@ private:
     Fn::Deployment::Component rootComponent_;
     MadeOnce<FaceFinder::Body> faceFinder_;
     MadeOnce<EyesFinder::Body> eyesFinder_;
+    MadeOnce<Cmp::Strategy> cmpStrategy_;
     mutable FNCountedPtr<FG::DllFrameGrabberFactoryCache> dllFrameGrabberFactoryCache_;
 };
 

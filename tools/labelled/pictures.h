@@ -12,7 +12,7 @@
 
 /// Labelled pictures to judge finders on.
 
-namespace Eval {
+namespace Labelled {
 
 /// What the label of one face says, image pixels.
 struct FaceTruth {
@@ -27,17 +27,17 @@ struct FaceTruth {
     bool meantBy(const FaceFinder::Location& report) const;
 };
 
-struct LabelledPicture {
+struct Picture {
     std::filesystem::path file;
     std::vector<FaceTruth> faces;
 };
 
 /// Which pictures and faces to judge on.
 struct Selection {
-    std::vector<std::string> labels;      ///< files in the format of labels.tsv
-    std::optional<Labelled::Split> split; ///< only this part, all of it if not set
-    bool onlyByHand = false;              ///< only faces whose eyes were labelled by hand count
-    double leastEyeDistance = 0;          ///< of the faces that count, pixels
+    std::vector<std::string> labels; ///< files in the format of labels.tsv
+    std::optional<Split> split;      ///< only this part, all of it if not set
+    bool onlyByHand = false;         ///< only faces whose eyes were labelled by hand count
+    double leastEyeDistance = 0;     ///< of the faces that count, pixels
     double mostEyeDistance = 1e9;
     double mostRotation = 180; ///< of the line through the eyes, degrees
     std::string groupColumn;   ///< column to divide figures by
@@ -45,9 +45,9 @@ struct Selection {
 };
 
 /// @throws FNEIOError naming the file and the line
-std::vector<LabelledPicture> picturesOf(const Selection& selection);
+std::vector<Picture> picturesOf(const Selection& selection);
 
 /// Calls visit(i) for all i below n, from as many threads as there are jobs.
 void forEachOf(std::size_t n, unsigned jobs, const std::function<void(std::size_t i)>& visit);
 
-} // namespace Eval
+} // namespace Labelled

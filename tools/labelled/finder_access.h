@@ -8,7 +8,7 @@
 #include <filesystem>
 #include <string>
 
-namespace Eval {
+namespace Labelled {
 
 /// The finders with their default settings on the model files below `etc`.
 /// @throws FNEIOError naming the file that is missing or damaged
@@ -18,4 +18,4 @@ EyesFinder makeEyesFinder(const std::filesystem::path& etc, const std::string& s
 MouthFinder makeMouthFinder(const std::filesystem::path& etc);
 BridgeFinder makeBridgeFinder(const std::filesystem::path& etc);
 
-} // namespace Eval
+} // namespace Labelled

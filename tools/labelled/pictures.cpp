@@ -1,4 +1,4 @@
-#include "eval/pictures.h"
+#include "labelled/pictures.h"
 
 #include <algorithm>
 #include <atomic>
@@ -6,10 +6,10 @@
 #include <numbers>
 #include <thread>
 
-namespace Eval {
+namespace Labelled {
 namespace {
 
-bool counts(const FaceTruth& face, const Labelled::Row& row, const Selection& selection) {
+bool counts(const FaceTruth& face, const Row& row, const Selection& selection) {
     const FNPos across = face.rightEye - face.leftEye;
     const double degrees = std::abs(std::atan2(across.y, across.x)) * 180 / std::numbers::pi;
     return (!selection.onlyByHand || row.text("source_labels") == "hand") &&
@@ -26,11 +26,11 @@ bool FaceTruth::meantBy(const FaceFinder::Location& report) const {
            ratio >= 1 / mostRatio;
 }
 
-std::vector<LabelledPicture> picturesOf(const Selection& selection) {
-    std::vector<LabelledPicture> pictures;
+std::vector<Picture> picturesOf(const Selection& selection) {
+    std::vector<Picture> pictures;
     for (const std::string& labels : selection.labels)
-        for (const Labelled::Row& row : Labelled::readLabels(labels)) {
-            if (selection.split && Labelled::splitOf(row.splitKey()) != *selection.split) continue;
+        for (const Row& row : readLabels(labels)) {
+            if (selection.split && splitOf(row.splitKey()) != *selection.split) continue;
             if (pictures.empty() || pictures.back().file != row.image())
                 pictures.push_back({row.image(), {}});
             const auto left = row.position("eye_left"), right = row.position("eye_right");
@@ -53,4 +53,4 @@ void forEachOf(std::size_t n, unsigned jobs, const std::function<void(std::size_
         });
 }
 
-} // namespace Eval
+} // namespace Labelled

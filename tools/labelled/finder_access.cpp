@@ -1,4 +1,4 @@
-#include "eval/finder_access.h"
+#include "labelled/finder_access.h"
 
 #include "eye/boca/mouth_finder.h"
 #include "eye/cara/face_finder.h"
@@ -6,7 +6,7 @@
 #include "eye/raiz/bridge_finder.h"
 #include "fn/deployment/app_config_db.h"
 
-namespace Eval {
+namespace Labelled {
 namespace {
 
 using namespace Fn::Deployment;
@@ -38,4 +38,4 @@ BridgeFinder makeBridgeFinder(const std::filesystem::path& etc) {
     return make<BridgeFinder, Eye::Raiz::BridgeFinder>(etc / "raiz");
 }
 
-} // namespace Eval
+} // namespace Labelled
