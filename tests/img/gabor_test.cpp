@@ -40,6 +40,31 @@ TEST(GaborInFourier, PeaksAtItsWaveVectorAndIsBlindToTheMean) {
     EXPECT_EQ(filter(2, 10).im, 0);
 }
 
+TEST(GaborInFourier, SumsTheGaussiansOfAllAliases) {
+    const struct {
+        double sigma;
+        FN2Vector<double> k;
+    } filters[] = {{2 * pi, {0.3, -0.5}}, {0.8 * pi, {pi, 0}}, {0.6, {1.2, 2.5}}, {2 * pi, {0.1, 0.05}}};
+    for (const auto& [sigma, k] : filters) {
+        FNImage<FNComplex<float>> filter(40, 24);
+        Img::gaborInFourier(sigma, k, filter, 1e-6);
+        const double C = 2 * pi * pi * sigma * sigma / dot(k, k), least = std::log(1e-6 / (40 * 24));
+        const auto term = [&](double e) { return e > least ? std::exp(e) : 0; };
+        for (std::uint32_t Y = 0; Y < 24; ++Y)
+            for (std::uint32_t X = 0; X < 40; ++X) {
+                double sum = 0;
+                for (int n = -3; n <= 3; ++n)
+                    for (int m = -3; m <= 3; ++m) {
+                        const double x = X / 40.0 + n, y = Y / 24.0 + m;
+                        const double dx = x - k.x / (2 * pi), dy = y - k.y / (2 * pi);
+                        sum +=
+                            term(-C * (dx * dx + dy * dy)) - term(-sigma * sigma / 2 - C * (x * x + y * y));
+                    }
+                ASSERT_NEAR(filter(X, Y).re, 2 * pi * sum, 1e-6) << sigma << " " << X << " " << Y;
+            }
+    }
+}
+
 TEST(GaborTransformation, AnswersMostToTheGratingOfItsOwnWaveVector) {
     const GaborFourierTransformation<float, GazeAway> gabor;
     for (unsigned s = 0; s < 2; ++s)

@@ -151,6 +151,19 @@ TEST_F(MatchingWithModels, ScoresTellRatesAndRawScores) {
     EXPECT_EQ(Score(RawScore(3)), 3);
 }
 
+TEST_F(MatchingWithModels, SamplesAreMeasuredByThePortraitAnalyzer) {
+    const std::string folder = folder_->path().string();
+    const Configuration c = configuration(
+        "ORBEK.ComparisonAlgorithm.AlgorithmVersion.B7.PortraitAnalyzer.DataDir = " + folder + "\n");
+    const Cmp::RecordBuilder builder = Comparison(c).strategy().algorithm()->createRecordBuilder();
+    FNImage<unsigned char> image(300, 300);
+    for (std::uint32_t i = 0; i < image.size(); ++i)
+        image.getExclusive()[i] = static_cast<unsigned char>(i * 2654435761u >> 24);
+    const Cmp::Sample sample(FNImageReferenceFactory::create(image), {120, 100}, {180, 100});
+    EXPECT_EQ(thrownBy([&] { builder->pushSample(sample); }),
+              "FNEIOError: Could not open data file " + folder + "/fpdisc.dat for reading");
+}
+
 TEST(Matching, NeedsItsModelsWhenItIsFirstUsed) {
     std::istringstream none("ORBEK.Substitutions.INSTALLDIR = /no/such\n"),
         wrong("ORBEK.ComparisonAlgorithm.AlgorithmVersion = X\n");

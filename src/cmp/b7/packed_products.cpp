@@ -170,7 +170,8 @@ void groupSums(std::index_sequence<n...>, const GroupRun& run, const signed char
 template <std::size_t N>
 void sums(std::span<const GroupRun> runs, const signed char* const* probes, std::int64_t* out) {
     const std::make_index_sequence<N> n;
-    for (std::size_t g = 0; g < runs.size(); ++g) switch (runs[g].bits) {
+    for (std::size_t g = 0; g < runs.size(); ++g) {
+        switch (runs[g].bits) {
         case 3:
             groupSums<3>(n, runs[g], probes, out + g, PackedProducts::mostGroups);
             break;
@@ -180,6 +181,7 @@ void sums(std::span<const GroupRun> runs, const signed char* const* probes, std:
         default:
             groupSums<5>(n, runs[g], probes, out + g, PackedProducts::mostGroups);
         }
+    }
 }
 void sums1(std::span<const GroupRun> runs, const signed char* const* probes, std::int64_t* out) {
     sums<1>(runs, probes, out);
@@ -253,6 +255,7 @@ std::vector<Place> placesOf(unsigned int bits) {
     return places;
 }
 
+/// So many words or more, in vectors of any size.
 constexpr std::size_t wholeVectors(std::size_t words) {
     return (words + vectorWords - 1) / vectorWords * vectorWords;
 }
@@ -335,7 +338,7 @@ PackedProducts::Probe PackedProducts::prepare(const unsigned char* packed) const
 
 void PackedProducts::sums(const unsigned char* packed, std::span<const Probe> probes, Sums* out,
                           const unsigned char* ahead) const {
-    std::array<GroupRun, mostGroups> runs;
+    std::array<GroupRun, mostGroups> runs{};
     for (std::size_t g = 0; g < groups_.size(); ++g) {
         const Group& group = groups_[g];
         const std::size_t begin = 4 * (group.begin - group.pad);

@@ -28,7 +28,7 @@ public:
     /// @throws FNEBadArg for others, or if their sums do not fit
     explicit PackedProducts(const Blocks& blocks);
 
-    /// A prepared feature: for each byte that a mask leaves of a packed one, the factor of it.
+    /// A prepared feature: factors of the bytes of packed ones, once they are taken apart.
     class Probe {
     private:
         friend class PackedProducts;
