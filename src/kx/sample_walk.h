@@ -41,9 +41,9 @@ template <class Operation> bool tellEyes(const Operation& operation, const Senso
     return true;
 }
 
-/// Begins with a sample: looks for its eyes unless they are known. @return whether it has both eyes
+/// Tells of a sample, and looks for its eyes unless they are known. @return whether it has both eyes
 template <class Operation>
-bool begin(const Operation& operation, const EyeSearch& eyes, SensorSample& sample, int index) {
+bool lookAt(const Operation& operation, const EyeSearch& eyes, SensorSample& sample, int index) {
     operation.broadcast(OperationInterest::ProcessingSample{index, sample.image});
     if (!sample.hasEyes()) eyes.find(sample);
     return tellEyes(operation, sample, index);
@@ -57,7 +57,7 @@ bool walk(const Operation& operation, const EyeSearch& eyes, const std::list<Sen
     int index = 0;
     for (SensorSample sample : samples) {
         sample.image = cachingIntensity(sample.image);
-        if (begin(operation, eyes, sample, index) && use(sample, index)) return true;
+        if (lookAt(operation, eyes, sample, index) && use(sample, index)) return true;
         ++index;
     }
     return false;
@@ -67,7 +67,7 @@ template <class Operation, class Use>
 bool walk(const Operation& operation, const EyeSearch& eyes, const FNImageSet& images, Use use) {
     for (int index = 0; index < images.count(); ++index) {
         SensorSample sample(cachingIntensity(images[index]));
-        if (begin(operation, eyes, sample, index) && use(sample, index)) return true;
+        if (lookAt(operation, eyes, sample, index) && use(sample, index)) return true;
     }
     return false;
 }

@@ -44,7 +44,7 @@ void StreamIdentifier::identify(const Fn::VideoSource& source, const Cmp::Popula
     bool found = false, late = false;
     while (!found && !late) {
         SensorSample sample = Implementation::nextSample(source);
-        found = Implementation::begin(*this, eyes_, sample, index) && identifier.compare(sample);
+        found = Implementation::lookAt(*this, eyes_, sample, index) && identifier.compare(sample);
         late = timeUp();
         ++index;
         if (found && !late) life.addFace(sample.face());

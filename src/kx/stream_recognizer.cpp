@@ -55,7 +55,7 @@ void StreamRecognizer::recognize(const std::list<Fn::VideoSource>& sources, cons
     do {
         SensorSample sample(Implementation::cachingIntensity(*image));
         accepted =
-            Implementation::begin(*this, eyes_, sample, attempt) && recognizer.compare(sample, attempt);
+            Implementation::lookAt(*this, eyes_, sample, attempt) && recognizer.compare(sample, attempt);
         if (accepted && lifeChecker_) {
             life.addFace(sample.face());
             accepted = life.isAlive();
