@@ -119,8 +119,8 @@ void packedProducts(benchmark::State& state) {
     const Encoder encoder;
     const auto bytes = encoder.createEncodedType();
     const unsigned char* const packed = bytes.data() + Encoder::headerSize;
-    const std::vector<PackedProducts::Probe> probes(static_cast<std::size_t>(state.range(0)),
-                                                    encoder.packedProducts().prepare(packed));
+    const std::vector<const unsigned char*> features(static_cast<std::size_t>(state.range(0)), packed);
+    const auto probes = encoder.packedProducts().prepare(features);
     std::vector<PackedProducts::Sums> sums(probes.size());
     for (auto _ : state) {
         encoder.packedProducts().sums(packed, probes, sums.data());

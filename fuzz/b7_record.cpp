@@ -30,9 +30,9 @@ void compare(const Records::Record& record) {
         encoder.decode(a, x);
         encoder.decode(b, y);
         const PackedProducts& products = encoder.packedProducts();
-        const PackedProducts::Probe probe = products.prepare(a + Encoder::headerSize);
+        const unsigned char* const codes = a + Encoder::headerSize;
         PackedProducts::Sums sums;
-        products.sums(b + Encoder::headerSize, {&probe, 1}, &sums);
+        products.sums(b + Encoder::headerSize, products.prepare({&codes, 1}), &sums);
         if (encoder.product(sums) != encoder.wordDotProduct(x.vector.get(), y.vector.get())) std::abort();
     }
 }

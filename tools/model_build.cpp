@@ -1,5 +1,6 @@
 #include "model_build.h"
 
+#include "b7_factors.h"
 #include "fn/exception.h"
 
 #include <algorithm>
@@ -46,12 +47,23 @@ void inflate(const fs::path& source, std::ostream& target) {
     }
 }
 
+/// A compressed B7Factors, to the file of the transformation.
+void multiply(const fs::path& source, std::ostream& target) {
+    std::stringstream factors;
+    inflate(source, factors);
+    try {
+        B7Factors::read(factors).unpack().write(target);
+    } catch (const FNEBadFormat& e) {
+        FN_THROW(FNEBadFormat, source.string() + ": " + e.what());
+    }
+}
+
 /// How a source becomes a file, by the suffix that is taken off its name.
 struct Unpacker {
     const char* suffix;
     void (*unpack)(const fs::path& source, std::ostream& target);
 };
-constexpr Unpacker unpackers[] = {{".gz", inflate}};
+constexpr Unpacker unpackers[] = {{".gz", inflate}, {".factors", multiply}};
 
 /// All sources below a folder, sorted, by their path in it.
 std::set<fs::path> sourcesOf(const fs::path& models) {

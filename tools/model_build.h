@@ -8,7 +8,8 @@
 
 /// From the compact sources of trained content to the files that the library reads.
 ///
-/// A source `models/DIR/FILE.gz` unpacks to `etc/DIR/FILE`; a source without a suffix that is known here is
+/// A source `models/DIR/FILE.gz` unpacks to `etc/DIR/FILE`, one that ends in `.factors` is multiplied out
+/// (b7_factors.h); a source without a suffix that is known here is
 /// copied. `models/SHA256SUMS` lists the sum of each unpacked file in the format of sha256sum, with its path
 /// below etc. Markdown is no source.
 

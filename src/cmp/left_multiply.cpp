@@ -11,6 +11,7 @@ namespace Cmp::HWY_NAMESPACE {
 namespace {
 namespace hn = hwy::HWY_NAMESPACE;
 
+#if HWY_TARGET != HWY_SCALAR
 /// Products of a vector with several columns at once: the vector comes from the second cache, the columns
 /// from memory, and the more of these are on their way the better.
 /// @param size of the vector and of each column; what is behind whole vectors is left out
@@ -35,6 +36,14 @@ HWY_INLINE std::size_t columnProducts(std::index_sequence<n...>, const short* v,
     ((out[n] = hn::GetLane(hn::SumOfLanes(wide, hn::Add(sums[n], others[n])))), ...);
     return i;
 }
+#else
+template <std::size_t... n>
+std::size_t columnProducts(std::index_sequence<n...>, const short*, const signed char*, std::size_t,
+                           std::int32_t* out) {
+    ((out[n] = 0), ...);
+    return 0;
+}
+#endif
 
 /// Sums may pass 32 bits, as long as they are cut to them: what is lost on the way is lost in the end.
 template <std::size_t N>

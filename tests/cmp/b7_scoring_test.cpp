@@ -47,18 +47,18 @@ TEST(PackedProducts, AreThoseOfWordsOnAllVectorUnits) {
     const Encoder encoder;
     const std::vector<Packed> features = extremeFeatures(encoder);
     std::vector<FixedPointFeature> words;
-    std::vector<PackedProducts::Probe> probes;
+    std::vector<const unsigned char*> codes;
     for (const Packed& feature : features) {
         words.push_back(encoder.createRawFixedType());
         encoder.decode(feature.data(), words.back());
-        probes.push_back(encoder.packedProducts().prepare(feature.data() + Encoder::headerSize));
+        codes.push_back(feature.data() + Encoder::headerSize);
     }
     forEachTarget([&] {
-        for (std::size_t n = 1; n <= probes.size(); ++n)
+        for (std::size_t n = 1; n <= codes.size(); ++n) {
+            const auto probes = encoder.packedProducts().prepare({codes.data(), n});
             for (std::size_t g = 0; g < features.size(); ++g) {
                 std::vector<PackedProducts::Sums> sums(n);
-                encoder.packedProducts().sums(features[g].data() + Encoder::headerSize, {probes.data(), n},
-                                              sums.data(), features[0].data());
+                encoder.packedProducts().sums(codes[g], probes, sums.data(), codes[0]);
                 for (std::size_t p = 0; p < n; ++p) {
                     const short *a = words[g].vector.get(), *b = words[p].vector.get();
                     for (std::size_t group = 0; group < 3; ++group) {
@@ -77,6 +77,7 @@ TEST(PackedProducts, AreThoseOfWordsOnAllVectorUnits) {
                               encoder.wordDotProduct(words[g].vector.get(), words[p].vector.get()));
                 }
             }
+        }
     });
 }
 

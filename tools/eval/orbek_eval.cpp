@@ -4,6 +4,8 @@
 #include "eval/detect.h"
 #include "eval/landmarks.h"
 #include "eval/plot.h"
+#include "eval/portrait.h"
+#include "eval/recognition.h"
 #include "eval/yardsticks.h"
 #include "fn/exception.h"
 #include "labelled/finder_access.h"
@@ -18,6 +20,7 @@ namespace {
 /// What all reports take.
 struct Options {
     Labelled::Selection selection;
+    Eval::PeopleSelection people; ///< what only reports on recognition take
     Eval::EyeDistances eyeDistances;
     std::string etc, finder = "orbek", settings = "Strict", json, plot;
 };
@@ -74,6 +77,44 @@ int eyes(const Options& options) {
     return statusOf(report.failures);
 }
 
+int portrait(const Options& options) {
+    const Eval::PortraitReports reports =
+        Eval::measurePortraits(options.etc, options.selection, options.eyeDistances);
+    Eval::printPortraits(reports, std::cout);
+    if (!options.json.empty()) writeFile(options.json, Eval::portraitsJson(reports));
+    return statusOf(reports.failures);
+}
+
+/// Enrols the people of the options, and hands their records to a report.
+template <class Report> auto recognise(const Options& options, Report report) {
+    Eval::PeopleSelection selection = options.people;
+    selection.labels = options.selection.labels;
+    selection.split = options.selection.split;
+    selection.jobs = options.selection.jobs;
+    const Eval::Enrolment enrolment(options.etc, options.eyeDistances);
+    const auto result = report(enrolment.enrol(selection), enrolment.strategy(), selection.jobs);
+    Eval::print(result, std::cout);
+    if (!options.json.empty()) writeFile(options.json, Eval::toJson(result));
+    return result;
+}
+
+int verify(const Options& options) {
+    const Eval::VerificationReport report = recognise(options, Eval::verify);
+    if (!options.plot.empty())
+        writeFile(options.plot, Eval::plotSvg("Verification", {"false acceptance rate", 1e-5, 1, true},
+                                              {"false rejection rate", 0, 1}, {{"orbek", report.curve}}));
+    return statusOf(report.failures);
+}
+
+int identify(const Options& options) {
+    const Eval::IdentificationReport report = recognise(options, Eval::identify);
+    if (!options.plot.empty())
+        writeFile(options.plot, Eval::plotSvg("Identification",
+                                              {"searches for strangers that find somebody", 1e-3, 1, true},
+                                              {"people who are not found", 0, 1}, {{"orbek", report.curve}}));
+    return statusOf(report.failures);
+}
+
 CLI::App* report(CLI::App& app, const char* name, const char* doc, Options& options) {
     CLI::App* const command = app.add_subcommand(name, doc);
     Labelled::Selection& selection = options.selection;
@@ -126,8 +167,28 @@ int main(int argc, char** argv) {
     eyesCommand->add_option("--settings", options.settings, "Thresholds of the eyes finder")
         ->check(CLI::IsMember({"Strict", "Tolerant"}))
         ->capture_default_str();
+    CLI::App* const portraitCommand =
+        report(app, "portrait", "How often the portrait analyser is right", options);
+    const auto recognition = [&](const char* name, const char* doc) {
+        CLI::App* const command = report(app, name, doc, options);
+        command
+            ->add_option("--pictures", options.people.picturesPerRecord,
+                         "Pictures in a record that single pictures are compared with")
+            ->check(CLI::PositiveNumber)
+            ->capture_default_str();
+        command->add_option("--max-yaw", options.people.mostYaw,
+                            "Only pictures of heads that are turned no more to a side, degrees");
+        command->add_option("--max-light", options.people.mostLightAngle,
+                            "Only pictures lit from no more degrees off the front");
+        return command;
+    };
+    CLI::App* const verifyCommand = recognition("verify", "Error rates of comparing two people");
+    CLI::App* const identifyCommand = recognition("identify", "Error rates of searches in a gallery");
     CLI11_PARSE(app, argc, argv);
     try {
+        if (*verifyCommand) return verify(options);
+        if (*identifyCommand) return identify(options);
+        if (*portraitCommand) return portrait(options);
         return *detectCommand ? detect(options) : eyes(options);
     } catch (const std::exception& e) {
         std::cerr << "orbek-eval: " << e.what() << "\n";

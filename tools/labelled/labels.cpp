@@ -50,6 +50,14 @@ std::string Row::splitKey() const {
     };
     constexpr CutSet cutSets[] = {{"helen_", 1}, {"net_7876__", 2}, {"net_7876_", 1}};
     const std::string stem = image_.stem().string();
+    // Neighbouring pictures of single eyes often show one person.
+    for (const std::string_view prefix : {"open_", "closed_"}) {
+        constexpr int run = 40;
+        int number = 0;
+        const char* const end = stem.data() + stem.size();
+        if (stem.starts_with(prefix) && std::from_chars(stem.data() + prefix.size(), end, number).ptr == end)
+            return std::string(prefix) + std::to_string(number / run);
+    }
     for (const auto& [prefix, parts] : cutSets) {
         if (!stem.starts_with(prefix)) continue;
         std::size_t end = prefix.size() - 1;

@@ -24,7 +24,8 @@ public:
     std::optional<double> number(const std::string& column) const;
     /// The position in the columns <name>_x and <name>_y, image pixels.
     std::optional<FNPos> position(const std::string& name) const;
-    /// What decides to which split the row belongs: the person, else the photo (whatever was cut from it).
+    /// What decides to which split the row belongs: the person, else the photo (whatever was cut from it) or
+    /// a run of pictures that are likely to show one person.
     std::string splitKey() const;
 
 private:

@@ -14,11 +14,22 @@ namespace Train {
 namespace {
 
 constexpr double scoreSlope = 3;
+/// The FAR at a score of 0.5.
+constexpr double farOfMiddle = 1e-3;
 /// How far the table of scores reaches: to rates of 1e-10 on either side.
 constexpr double logSmallestRate = -23.0;
 
 double logistic(double u) {
     return 1 / (1 + std::exp(-u / scoreSlope));
+}
+
+/// Where an ascending function has a value, between two places.
+template <class F> double placeWhere(F f, double y, double low, double high) {
+    for (int i = 0; i < 60; ++i) {
+        const double middle = low + (high - low) / 2;
+        (f(middle) < y ? low : high) = middle;
+    }
+    return low + (high - low) / 2;
 }
 
 /// Share of a normal distribution above z standard deviations.
@@ -133,22 +144,16 @@ Fn::InvertibleFunction<float, float> Calibration::tabulate() const {
         FN_THROW(FNEBadArg, "Calibration: genuine scores are not higher than impostor scores");
     // Where the scores are far apart, the places change their order; then the table lies between them.
     const auto [low, high] = std::minmax({frr_.placeOf(logSmallestRate), far_.placeOf(logSmallestRate)});
-    const double first = logistic(logRatio(low)), last = logistic(logRatio(high));
+    const double anchor =
+        logRatio(placeWhere([&](double raw) { return -logFar(raw); }, -std::log(farOfMiddle), low, high));
+    const auto scoreOf = [&](double raw) { return logistic(logRatio(raw) - anchor); };
+    const double first = scoreOf(low), last = scoreOf(high);
     std::vector<float> values(samples);
     for (int i = 0; i < samples; ++i) {
-        const double score = logistic(logRatio(low + (high - low) * i / (samples - 1)));
+        const double score = scoreOf(low + (high - low) * i / (samples - 1));
         values[static_cast<std::size_t>(i)] = static_cast<float>((score - first) / (last - first));
     }
     return {FNVector<float>(values), static_cast<float>(low), static_cast<float>(high)};
-}
-
-template <class F> double Calibration::solve(F f, double y) const {
-    double low = scores_.xMin(), high = scores_.xMax();
-    for (int i = 0; i < 60; ++i) {
-        const double middle = low + (high - low) / 2;
-        (f(middle) < y ? low : high) = middle;
-    }
-    return low + (high - low) / 2;
 }
 
 namespace {
@@ -200,6 +205,7 @@ void reportTail(std::ostream& stream, const char* name, const char* side, const 
 } // namespace
 
 void Calibration::report(std::ostream& stream) const {
+    const auto solve = [&](auto f, double y) { return placeWhere(f, y, scores_.xMin(), scores_.xMax()); };
     const double equal = solve([&](double raw) { return logRatio(raw); }, 0);
     stream << frr_.count() << " genuine and " << far_.count() << " impostor pairs. Equal error rate "
            << std::exp(logFar(equal)) * 100 << " % at raw score " << equal << ", score "

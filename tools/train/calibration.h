@@ -58,10 +58,10 @@ private:
 
 /// The three mapping tables of a comparison algorithm.
 ///
-/// A score is 1 / (1 + exp(-u / 3)) with u = log(FRR) - log(FAR) at its raw score, stretched to reach 0 and 1
-/// at the ends of the table: 0.5 is where both rates are equal, and each step of 0.1 near the middle changes
-/// the ratio of the rates threefold. 3 puts a FAR of 1e-6 near 0.99, so that the rates tables, which have
-/// equal steps of score, resolve it.
+/// A score is 1 / (1 + exp(-u / 3)), where u is log(FRR) - log(FAR) at its raw score less the same where the
+/// FAR is 0.001, stretched to reach 0 and 1 at the ends of the table: 0.5 stands for a FAR of 0.001, and each
+/// step of 0.1 near the middle changes the ratio of the rates threefold. 3 puts a FAR of 1e-6 near 0.99, so
+/// that the rates tables, which have equal steps of score, resolve it.
 struct Calibration {
     static constexpr int samples = 4001; ///< of each table
 
@@ -82,8 +82,6 @@ struct Calibration {
 private:
     Fn::InvertibleFunction<float, float> tabulate() const;
     double logRatio(double raw) const { return logFrr(raw) - logFar(raw); }
-    /// The raw score where an ascending function of it has a value.
-    template <class F> double solve(F f, double y) const;
 
     TailShare far_;
     TailShare frr_;

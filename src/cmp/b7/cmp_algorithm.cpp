@@ -65,8 +65,7 @@ FIR CmpAlgorithm::merge(const std::list<FIR>& earlier, const FIR& added) const {
 }
 
 float CmpAlgorithm::one2one(const FIR& first, const FIR& second) const {
-    const FNCountedPtr<PreparedProbes> probe(new PreparedProbes(core_));
-    probe->add(first);
+    const FNCountedPtr<PreparedProbes> probe(new PreparedProbes(core_, {&first, 1}));
     float result;
     PackedScorer(probe).score(core_->records().record(second), nullptr, {&result, 1});
     return result;
@@ -79,8 +78,7 @@ Population CmpAlgorithm::createPopulation(unsigned int capacity) const {
 std::list<GalleryIterator> CmpAlgorithm::prepareFew2Many(const std::vector<FIR>& probes,
                                                          const Fn::View<Population>::Iterator& populations,
                                                          unsigned int partitions) const {
-    const FNCountedPtr<PreparedProbes> prepared(new PreparedProbes(core_));
-    for (const FIR& probe : probes) prepared->add(probe);
+    const FNCountedPtr<PreparedProbes> prepared(new PreparedProbes(core_, probes));
     return walkGallery(populations, partitions, probes.size(), GalleryComparer(core_, prepared), "Pcld");
 }
 

@@ -35,16 +35,17 @@ template <> struct Planes<5> {
 };
 
 /// Vectors of up to so many words go over a group without a rest.
-constexpr std::size_t vectorWords = 16;
+constexpr std::size_t chunkWords = 16;
+constexpr std::size_t chunkBytes = 4 * chunkWords;
 
 /// A run over the words of one group.
 struct GroupRun {
     unsigned int bits;
     const unsigned char* packed;
     const unsigned char* ahead; ///< is fetched
-    std::size_t words;          ///< a multiple of vectorWords
+    std::size_t chunks;
     const short* weights;
-    std::size_t factors; ///< place among those of a probe; those of one plane lie one behind the other
+    const signed char* factors; ///< chunks of bytes: by 16 words, plane, probe
 };
 
 } // namespace
@@ -57,7 +58,7 @@ namespace {
 namespace hn = hwy::HWY_NAMESPACE;
 
 #if HWY_TARGET != HWY_SCALAR
-using Bytes = hn::CappedTag<std::uint8_t, 4 * vectorWords>;
+using Bytes = hn::CappedTag<std::uint8_t, chunkBytes>;
 using Words = hn::Repartition<std::uint32_t, Bytes>;
 using Pairs = hn::Repartition<std::int16_t, Bytes>;
 using Sums32 = hn::Repartition<std::int32_t, Bytes>;
@@ -98,10 +99,11 @@ template <unsigned int bits> struct Codes {
     }
 
     /// Adds the weighted products with the factors of one probe.
-    HWY_INLINE void addProducts(const signed char* factors, std::size_t planeSize, hn::Vec<Sums32>& sum,
+    /// @param stride from plane to plane
+    HWY_INLINE void addProducts(const signed char* factors, std::size_t stride, hn::Vec<Sums32>& sum,
                                 hn::Vec<Sums32>& other) const {
         const auto plane = [&](std::size_t k) HWY_ATTR {
-            const auto* const bytes = reinterpret_cast<const std::uint8_t*>(factors + k * planeSize);
+            const auto* const bytes = reinterpret_cast<const std::uint8_t*>(factors + k * stride);
             return hn::BitCast(Words(), hn::LoadU(Bytes(), bytes));
         };
         auto products = hn::Add(pairProducts(first, plane(0)), pairProducts(second, plane(1)));
@@ -122,81 +124,82 @@ HWY_INLINE std::int64_t sumOfLanes(hn::Vec<Sums32> v) {
     return hn::GetLane(hn::SumOfLanes(d, hn::Add(low, high)));
 }
 
-/// Weighted sums of the products of one group with those of several probes, each of which has registers of
+/// Weighted sums of the products of one group with those of several probes, each of which has a register of
 /// its own.
-/// @param out of each probe in turn, `stride` apart
+/// @param out of each probe in turn, a Sums apart
 template <unsigned int bits, std::size_t... n>
-HWY_INLINE void groupSums(std::index_sequence<n...>, const GroupRun& run, const signed char* const* probes,
-                          std::int64_t* out, std::size_t stride) {
+HWY_INLINE void groupSums(std::index_sequence<n...>, const GroupRun& run, std::int64_t* out) {
+    constexpr std::size_t stride = sizeof...(n) * chunkBytes;
     const Sums32 d;
-    const std::size_t lanes = hn::Lanes(d), planeSize = 4 * run.words;
-    const signed char* const factors[] = {probes[n] + run.factors...};
+    const std::size_t lanes = hn::Lanes(d);
     hn::Vec<Sums32> sums[] = {(static_cast<void>(n), hn::Zero(d))...};
     hn::Vec<Sums32> others[] = {(static_cast<void>(n), hn::Zero(d))...};
-    for (std::size_t w = 0; w < run.words; w += vectorWords) {
-        hwy::Prefetch(run.ahead + 4 * w);
-        for (std::size_t i = w; i < w + vectorWords; i += lanes) {
-            const Codes<bits> codes(run.packed + 4 * i, run.weights + 2 * i);
-            (codes.addProducts(factors[n] + 4 * i, planeSize, sums[n], others[n]), ...);
+    const signed char* factors = run.factors;
+    for (std::size_t c = 0; c < run.chunks; ++c, factors += Codes<bits>::planes * stride) {
+        hwy::Prefetch(run.ahead + c * chunkBytes);
+        for (std::size_t i = 0; i < chunkWords; i += lanes) {
+            const std::size_t word = c * chunkWords + i;
+            const Codes<bits> codes(run.packed + 4 * word, run.weights + 2 * word);
+            (codes.addProducts(factors + n * chunkBytes + 4 * i, stride, sums[n], others[n]), ...);
         }
     }
-    ((out[n * stride] = sumOfLanes(hn::Add(sums[n], others[n]))), ...);
+    ((out[n * PackedProducts::mostGroups] = sumOfLanes(hn::Add(sums[n], others[n]))), ...);
 }
 #else
 template <unsigned int bits, std::size_t... n>
-void groupSums(std::index_sequence<n...>, const GroupRun& run, const signed char* const* probes,
-               std::int64_t* out, std::size_t stride) {
-    constexpr std::size_t planes = std::size(Planes<bits>::shifts);
-    for (const std::size_t i : {n...}) {
-        const signed char* const factors = probes[i] + run.factors;
+void groupSums(std::index_sequence<n...>, const GroupRun& run, std::int64_t* out) {
+    constexpr std::size_t planes = std::size(Planes<bits>::shifts), probes = sizeof...(n);
+    for (const std::size_t p : {n...}) {
         std::int64_t total = 0;
-        for (std::size_t w = 0; w < run.words; ++w) {
+        for (std::size_t w = 0; w < run.chunks * chunkWords; ++w) {
             std::uint32_t packed;
             std::memcpy(&packed, run.packed + 4 * w, 4);
             int sum = 0;
             for (std::size_t k = 0; k < planes; ++k) {
                 const std::uint32_t codes = packed >> Planes<bits>::shifts[k] & Planes<bits>::masks[k];
+                const signed char* const factors = run.factors +
+                                                   ((w / chunkWords * planes + k) * probes + p) * chunkBytes +
+                                                   4 * (w % chunkWords);
                 for (unsigned int b = 0; b < 4; ++b)
-                    sum += static_cast<int>(codes >> 8 * b & 0xff) * factors[4 * (k * run.words + w) + b];
+                    sum += static_cast<int>(codes >> 8 * b & 0xff) * factors[b];
             }
             total += std::int64_t{sum} * run.weights[2 * w];
         }
-        out[i * stride] = total;
+        out[p * PackedProducts::mostGroups] = total;
     }
 }
 #endif
 
 /// Of all groups.
-template <std::size_t N>
-void sums(std::span<const GroupRun> runs, const signed char* const* probes, std::int64_t* out) {
+template <std::size_t N> void sums(std::span<const GroupRun> runs, std::int64_t* out) {
     const std::make_index_sequence<N> n;
-    for (std::size_t g = 0; g < runs.size(); ++g) {
-        switch (runs[g].bits) {
+    for (const GroupRun& run : runs) {
+        switch (run.bits) {
         case 3:
-            groupSums<3>(n, runs[g], probes, out + g, PackedProducts::mostGroups);
+            groupSums<3>(n, run, out++);
             break;
         case 4:
-            groupSums<4>(n, runs[g], probes, out + g, PackedProducts::mostGroups);
+            groupSums<4>(n, run, out++);
             break;
         default:
-            groupSums<5>(n, runs[g], probes, out + g, PackedProducts::mostGroups);
+            groupSums<5>(n, run, out++);
         }
     }
 }
-void sums1(std::span<const GroupRun> runs, const signed char* const* probes, std::int64_t* out) {
-    sums<1>(runs, probes, out);
+void sums1(std::span<const GroupRun> runs, std::int64_t* out) {
+    sums<1>(runs, out);
 }
-void sums2(std::span<const GroupRun> runs, const signed char* const* probes, std::int64_t* out) {
-    sums<2>(runs, probes, out);
+void sums2(std::span<const GroupRun> runs, std::int64_t* out) {
+    sums<2>(runs, out);
 }
-void sums3(std::span<const GroupRun> runs, const signed char* const* probes, std::int64_t* out) {
-    sums<3>(runs, probes, out);
+void sums3(std::span<const GroupRun> runs, std::int64_t* out) {
+    sums<3>(runs, out);
 }
-void sums4(std::span<const GroupRun> runs, const signed char* const* probes, std::int64_t* out) {
-    sums<4>(runs, probes, out);
+void sums4(std::span<const GroupRun> runs, std::int64_t* out) {
+    sums<4>(runs, out);
 }
-void sums5(std::span<const GroupRun> runs, const signed char* const* probes, std::int64_t* out) {
-    sums<5>(runs, probes, out);
+void sums5(std::span<const GroupRun> runs, std::int64_t* out) {
+    sums<5>(runs, out);
 }
 
 } // namespace
@@ -255,11 +258,6 @@ std::vector<Place> placesOf(unsigned int bits) {
     return places;
 }
 
-/// So many words or more, in vectors of any size.
-constexpr std::size_t wholeVectors(std::size_t words) {
-    return (words + vectorWords - 1) / vectorWords * vectorWords;
-}
-
 } // namespace
 
 PackedProducts::PackedProducts(const Blocks& blocks) {
@@ -276,16 +274,16 @@ PackedProducts::PackedProducts(const Blocks& blocks) {
     if (groups_.size() > mostGroups) FN_THROW(FNEBadArg, "Products of more groups of blocks than expected");
     for (Group& group : groups_) {
         // Vectors reach over the end of a group, or over its beginning where a feature ends with it.
-        const std::size_t rest = wholeVectors(group.words) - group.words;
+        group.chunks = (group.words + chunkWords - 1) / chunkWords;
+        const std::size_t rest = group.chunks * chunkWords - group.words;
         const bool before = group.begin + group.words + rest > words;
         if (before && rest > group.begin) FN_THROW(FNEBadArg, "Products of features that are too short");
         group.pad = before ? rest : 0;
-        group.padded = group.words + rest;
         group.scaleBits = std::countr_zero(static_cast<unsigned int>(planesOf(group.bits).scale));
         group.weights = weights_.size();
-        group.factors = factors_;
-        weights_.resize(weights_.size() + 2 * group.padded);
-        factors_ += 4 * planesOf(group.bits).shifts.size() * group.padded;
+        group.factors = chunks_;
+        weights_.resize(weights_.size() + group.chunks);
+        chunks_ += planesOf(group.bits).shifts.size() * group.chunks;
         fillWeights(group);
     }
 }
@@ -300,7 +298,8 @@ void PackedProducts::fillWeights(const Group& group) {
         const int weight = block.offset * block.offset;
         for (std::size_t i = 0; i < block.words; ++i, ++word) {
             for (std::size_t half = 0; half < 2; ++half)
-                weights_[group.weights + 2 * word + half] = static_cast<short>(weight);
+                weights_[group.weights + word / chunkWords].values[2 * (word % chunkWords) + half] =
+                    static_cast<short>(weight);
             lanes[word % 4] += weight * planes.scale * most * most * (32 / group.bits);
         }
         if (weight > 0x7fff || *std::ranges::max_element(lanes) > 0x7fffffff)
@@ -308,75 +307,83 @@ void PackedProducts::fillWeights(const Group& group) {
     }
 }
 
-PackedProducts::Probe PackedProducts::prepare(const unsigned char* packed) const {
-    Probe probe;
-    probe.factors.resize(factors_);
+PackedProducts::Probes PackedProducts::prepare(std::span<const unsigned char* const> packed) const {
+    Probes probes;
+    probes.size_ = packed.size();
+    for (; !packed.empty(); packed = packed.subspan(probes.batches_.back().size)) {
+        const std::size_t n = std::min(probesAtOnce, packed.size());
+        Probes::Batch& batch = probes.batches_.emplace_back();
+        batch.size = n;
+        batch.chunks.resize(n * chunks_);
+        batch.subtrahends.resize(n);
+        for (std::size_t i = 0; i < n; ++i) prepare(packed[i], i, batch);
+    }
+    return probes;
+}
+
+void PackedProducts::prepare(const unsigned char* packed, std::size_t place, Probes::Batch& batch) const {
     for (std::size_t g = 0; g < groups_.size(); ++g) {
         const Group& group = groups_[g];
-        const int codes = 1 << group.bits, scale = planesOf(group.bits).scale;
-        const std::size_t planeSize = 4 * group.padded;
+        const PlaneTable planes = planesOf(group.bits);
+        const int codes = 1 << group.bits;
         const std::vector<Place> places = placesOf(group.bits);
-        signed char* out = probe.factors.data() + group.factors + 4 * group.pad;
+        std::size_t word = group.pad;
         std::int64_t sum = 0;
         for (const Block& block : group.blocks)
-            for (std::size_t w = 0; w < block.words; ++w, packed += 4, out += 4) {
-                std::uint32_t word;
-                std::memcpy(&word, packed, sizeof word);
-                for (const Place& place : places) {
-                    if (w * (32 / group.bits) + place.code >= block.count) continue;
-                    const int code = static_cast<int>(word >> group.bits * place.code) & (codes - 1);
+            for (std::size_t w = 0; w < block.words; ++w, ++word, packed += 4) {
+                std::uint32_t bits;
+                std::memcpy(&bits, packed, sizeof bits);
+                for (const Place& at : places) {
+                    if (w * (32 / group.bits) + at.code >= block.count) continue;
+                    const int code = static_cast<int>(bits >> group.bits * at.code) & (codes - 1);
                     const int odd = 2 * code + 1 - codes;
-                    out[place.plane * planeSize + place.byte] =
-                        static_cast<signed char>(odd * scale / place.power);
+                    const std::size_t chunk = word / chunkWords * planes.shifts.size() + at.plane;
+                    batch.chunks[group.factors * batch.size + chunk * batch.size + place]
+                        .factors[4 * (word % chunkWords) + at.byte] =
+                        static_cast<signed char>(odd * planes.scale / at.power);
                     sum += odd * block.offset * block.offset;
                 }
             }
-        probe.subtrahends[g] = (codes - 1) * sum;
+        batch.subtrahends[place][g] = (codes - 1) * sum;
     }
-    return probe;
 }
 
-void PackedProducts::sums(const unsigned char* packed, std::span<const Probe> probes, Sums* out,
+void PackedProducts::sums(const unsigned char* packed, const Probes& probes, Sums* out,
                           const unsigned char* ahead) const {
-    std::array<GroupRun, mostGroups> runs{};
-    for (std::size_t g = 0; g < groups_.size(); ++g) {
-        const Group& group = groups_[g];
-        const std::size_t begin = 4 * (group.begin - group.pad);
-        runs[g] = {group.bits,
-                   packed + begin,
-                   (ahead ? ahead : packed) + begin,
-                   group.padded,
-                   weights_.data() + group.weights,
-                   group.factors};
-    }
-    while (!probes.empty()) {
-        const std::size_t n = std::min(probesAtOnce, probes.size());
-        const signed char* factors[probesAtOnce];
-        std::int64_t sums[probesAtOnce][mostGroups];
-        for (std::size_t i = 0; i < n; ++i) factors[i] = probes[i].factors.data();
+    for (const Probes::Batch& batch : probes.batches_) {
+        std::array<GroupRun, mostGroups> runs;
+        for (std::size_t g = 0; g < groups_.size(); ++g) {
+            const Group& group = groups_[g];
+            const std::size_t begin = 4 * (group.begin - group.pad);
+            runs[g] = {group.bits,
+                       packed + begin,
+                       (ahead ? ahead : packed) + begin,
+                       group.chunks,
+                       weights_[group.weights].values.data(),
+                       batch.chunks[group.factors * batch.size].factors.data()};
+        }
         const std::span<const GroupRun> all(runs.data(), groups_.size());
-        switch (n) {
+        std::int64_t sums[probesAtOnce * mostGroups];
+        switch (batch.size) {
         case 1:
-            HWY_DYNAMIC_DISPATCH(sums1)(all, factors, sums[0]);
+            HWY_DYNAMIC_DISPATCH(sums1)(all, sums);
             break;
         case 2:
-            HWY_DYNAMIC_DISPATCH(sums2)(all, factors, sums[0]);
+            HWY_DYNAMIC_DISPATCH(sums2)(all, sums);
             break;
         case 3:
-            HWY_DYNAMIC_DISPATCH(sums3)(all, factors, sums[0]);
+            HWY_DYNAMIC_DISPATCH(sums3)(all, sums);
             break;
         case 4:
-            HWY_DYNAMIC_DISPATCH(sums4)(all, factors, sums[0]);
+            HWY_DYNAMIC_DISPATCH(sums4)(all, sums);
             break;
         default:
-            HWY_DYNAMIC_DISPATCH(sums5)(all, factors, sums[0]);
+            HWY_DYNAMIC_DISPATCH(sums5)(all, sums);
         }
-        for (std::size_t i = 0; i < n; ++i)
+        for (std::size_t i = 0; i < batch.size; ++i, ++out)
             for (std::size_t g = 0; g < groups_.size(); ++g)
-                out[i][g] = 2 * (sums[i][g] >> groups_[g].scaleBits) - probes[i].subtrahends[g];
-        probes = probes.subspan(n);
-        out += n;
-        for (GroupRun& run : runs) run.ahead = run.packed;
+                (*out)[g] = 2 * (sums[i * mostGroups + g] >> groups_[g].scaleBits) - batch.subtrahends[i][g];
+        ahead = nullptr;
     }
 }
 

@@ -28,18 +28,32 @@ public:
     /// @throws FNEBadArg for others, or if their sums do not fit
     explicit PackedProducts(const Blocks& blocks);
 
-    /// A prepared feature: factors of the bytes of packed ones, once they are taken apart.
-    class Probe {
+    /// Prepared features: factors of the bytes of packed ones, once these are taken apart.
+    class Probes {
+    public:
+        std::size_t size() const { return size_; }
+
     private:
         friend class PackedProducts;
-        std::vector<signed char> factors;
-        Sums subtrahends{};
+        /// Factors of the bytes of 16 words.
+        struct alignas(64) Chunk {
+            std::array<signed char, 64> factors{};
+        };
+        /// Of up to so many, which are served by one run over a feature.
+        struct Batch {
+            std::size_t size;
+            std::vector<Chunk> chunks; ///< by group, 16 words, plane, probe
+            std::vector<Sums> subtrahends;
+        };
+        std::size_t size_ = 0;
+        std::vector<Batch> batches_;
     };
-    Probe prepare(const unsigned char* packed) const;
+    Probes prepare(std::span<const unsigned char* const> packed) const;
 
-    /// The sums of one feature with several.
+    /// The sums of one feature with each probe.
+    /// @param out probes.size() of them
     /// @param ahead what is going to be compared next, to be fetched meanwhile; may be null
-    void sums(const unsigned char* packed, std::span<const Probe> probes, Sums* out,
+    void sums(const unsigned char* packed, const Probes& probes, Sums* out,
               const unsigned char* ahead = nullptr) const;
 
 private:
@@ -52,17 +66,22 @@ private:
         std::size_t begin; ///< packed words before it
         std::size_t words = 0;
         std::vector<Block> blocks;
-        std::size_t padded = 0;               ///< words in whole vectors
-        int scaleBits = 0;                    ///< log2 of what all codes are multiplied with
         std::size_t pad = 0;                  ///< words before it that its vectors have, with factors 0
-        std::size_t weights = 0, factors = 0; ///< places of its own
+        std::size_t chunks = 0;               ///< of 16 words
+        std::size_t weights = 0, factors = 0; ///< chunks before its own, the latter for one probe
+        int scaleBits = 0;                    ///< log2 of what all codes are multiplied with
+    };
+    /// o^2, twice for each of 16 words.
+    struct alignas(64) Weights {
+        std::array<short, 32> values{};
     };
 
     void fillWeights(const Group& group);
+    void prepare(const unsigned char* packed, std::size_t place, Probes::Batch& batch) const;
 
     std::vector<Group> groups_;
-    std::vector<short> weights_; ///< o^2, twice for each word
-    std::size_t factors_ = 0;    ///< bytes
+    std::vector<Weights> weights_;
+    std::size_t chunks_ = 0; ///< of one probe
 };
 
 } // namespace Cmp::B7

@@ -11,17 +11,21 @@ constexpr float noScore = std::numeric_limits<float>::lowest();
 
 } // namespace
 
-void PreparedProbes::add(const FIR& probe) {
-    const auto& record = core_->records().record(probe);
-    for (std::size_t i = 0; i < record.count(); ++i) {
-        const unsigned char* const feature = record.feature(i);
-        Origin origin{probes_, 0, 0};
-        std::memcpy(&origin.mean, feature, sizeof(float));
-        std::memcpy(&origin.stdDev, feature + sizeof(float), sizeof(float));
-        origins_.push_back(origin);
-        features_.push_back(core_->encoder().packedProducts().prepare(feature + Encoder::headerSize));
+PreparedProbes::PreparedProbes(const FNCountedPtr<const Core>& core, std::span<const FIR> probes)
+    : core_(core), size_(probes.size()) {
+    std::vector<const unsigned char*> codes;
+    for (std::size_t p = 0; p < probes.size(); ++p) {
+        const auto& record = core->records().record(probes[p]);
+        for (std::size_t i = 0; i < record.count(); ++i) {
+            const unsigned char* const feature = record.feature(i);
+            Origin origin{p, 0, 0};
+            std::memcpy(&origin.mean, feature, sizeof(float));
+            std::memcpy(&origin.stdDev, feature + sizeof(float), sizeof(float));
+            origins_.push_back(origin);
+            codes.push_back(feature + Encoder::headerSize);
+        }
     }
-    ++probes_;
+    features_ = core->encoder().packedProducts().prepare(codes);
 }
 
 const unsigned char* PackedScorer::codes(const Record& record, std::size_t feature) const {

@@ -9,12 +9,10 @@ namespace Cmp::B7 {
 /// The features of the probes of a search, prepared to be compared with packed ones.
 class PreparedProbes {
 public:
-    explicit PreparedProbes(const FNCountedPtr<const Core>& core) : core_(core) {}
-
     /// @throws std::bad_cast for a record of another algorithm
-    void add(const FIR& probe);
+    PreparedProbes(const FNCountedPtr<const Core>& core, std::span<const FIR> probes);
     /// Number of probes.
-    std::size_t size() const { return probes_; }
+    std::size_t size() const { return size_; }
 
 private:
     friend class PackedScorer;
@@ -25,9 +23,9 @@ private:
     };
 
     FNCountedPtr<const Core> core_;
-    std::size_t probes_ = 0;
-    std::vector<PackedProducts::Probe> features_; ///< of all probes
-    std::vector<Origin> origins_;                 ///< of each feature
+    std::size_t size_;
+    std::vector<Origin> origins_; ///< of the features of all probes
+    PackedProducts::Probes features_;
 };
 
 /// Compares records with probes as they are, packed, and gives the same scores as score() of decoded ones,

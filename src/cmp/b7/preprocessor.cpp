@@ -39,12 +39,17 @@ std::vector<GaborBank::Scale> PreProcessor::setupColumnSelections() {
     return scales;
 }
 
-std::size_t PreProcessor::computeFeatureVectorSize() {
-    std::size_t points = 0;
+std::vector<FNPos> PreProcessor::gridPoints() {
+    std::vector<FNPos> points;
     for (std::size_t s = 0; s < NUM_SHAPED_GRIDS; ++s)
         for (unsigned int l = 0; l < ShapedGridLinesVert_[s]; ++l)
-            points += line(s, l).end - line(s, l).begin;
-    return points * orientations;
+            for (unsigned int j = line(s, l).begin; j < line(s, l).end; ++j)
+                points.push_back({static_cast<float>(pixelX(s, j)), static_cast<float>(pixelY(s, l))});
+    return points;
+}
+
+std::size_t PreProcessor::computeFeatureVectorSize() {
+    return gridPoints().size() * orientations;
 }
 
 FNImage<float> PreProcessor::normalize(FNImage<float> const& image) const {

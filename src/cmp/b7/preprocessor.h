@@ -34,6 +34,9 @@ public:
     /// 20604
     static std::size_t computeFeatureVectorSize();
 
+    /// Where the grid points are in the warped face, in the order of the raw vector: pixels.
+    static std::vector<FNPos> gridPoints();
+
     /// The first half: values spread evenly over -1 to 1.
     FNImage<float> normalize(FNImage<float> const& image) const;
     const Implementation::GaborBank& bank() const { return bank_; }

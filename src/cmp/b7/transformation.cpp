@@ -106,8 +106,7 @@ Transformation Transformation::read(const std::string& path, std::size_t rawSize
     return {factor, matrix, average, translation, base};
 }
 
-void Transformation::write(const std::string& path) const {
-    std::ofstream stream(path, std::ios::binary);
+void Transformation::write(std::ostream& stream) const {
     Fn::Package(factor).write(stream);
     const Weights unpadded = matrix.rows() == average.size()
                                  ? matrix
@@ -115,6 +114,11 @@ void Transformation::write(const std::string& path) const {
     static_cast<Fn::Package>(unpadded).write(stream);
     for (const FNVector<float>& vector : {average, translation, base})
         static_cast<Fn::Package>(vector).write(stream);
+}
+
+void Transformation::write(const std::string& path) const {
+    std::ofstream stream(path, std::ios::binary);
+    write(stream);
     stream.close();
     if (!stream) FN_THROW(FNEIOError, "Cannot write the transformation '" + path + "'");
 }

@@ -2,6 +2,7 @@
 
 #include "cmp/multiply_digitized.h"
 
+#include <iosfwd>
 #include <string>
 
 namespace Cmp::B7 {
@@ -25,7 +26,9 @@ struct Transformation {
     /// @param rawSize of raw vectors @param components of features
     /// @throws FNEIOError if the file cannot be opened or does not hold what it should
     static Transformation read(const std::string& path, std::size_t rawSize, std::size_t components);
-    /// Without the rows that fill up the matrix. @throws FNEIOError
+    /// Without the rows that fill up the matrix.
+    void write(std::ostream& stream) const;
+    /// The same to a file. @throws FNEIOError
     void write(const std::string& path) const;
 };
 

@@ -24,7 +24,8 @@ struct Neighbourhood {
 
 } // namespace
 
-GaborPyrProcessor::GaborPyrProcessor(const Params& params) : pyramid_(pyramidParams(params)) {
+GaborPyrProcessor::GaborPyrProcessor(const Params& params)
+    : pyramid_(pyramidParams(params), GaborPyramid::Places::ofOwnGrid) {
     if (params.variant != 0) FN_THROW(FNEBadArg, "Gabor pyramid: invalid parameters");
 }
 
@@ -41,7 +42,8 @@ FNVector<float> GaborPyrProcessor::operator()(const FNImage<float>& image) const
 }
 
 GaborPyrRankNormProcessor::GaborPyrRankNormProcessor(const Params& params)
-    : pyramid_(pyramidParams(params)), rankTable_({params.rankTable, rankTableSize}, rankTableSize) {
+    : pyramid_(pyramidParams(params), GaborPyramid::Places::ofAllGrids),
+      rankTable_({params.rankTable, rankTableSize}, rankTableSize) {
     for (const unsigned int radius : {params.scaleRadius, params.angleRadius, params.xRadius, params.yRadius})
         if (radius != 1) FN_THROW(FNEBadArg, "Gabor pyramid: invalid parameters");
     if (params.angles < 3) FN_THROW(FNEBadArg, "Gabor pyramid: invalid parameters");

@@ -34,23 +34,29 @@ std::vector<GaborPyramid::Grid> makeGrids(const GaborPyramidParams& params) {
     return grids;
 }
 
-/// All scales respond in the columns of all grids.
 std::vector<GaborBank::Scale> scalesOf(const GaborPyramidParams& params,
-                                       const std::vector<GaborPyramid::Grid>& grids) {
-    std::set<std::uint32_t> columns;
-    for (const GaborPyramid::Grid& grid : grids)
+                                       const std::vector<GaborPyramid::Grid>& grids,
+                                       GaborPyramid::Places places) {
+    const auto add = [](std::set<std::uint32_t>& columns, const GaborPyramid::Grid& grid) {
         for (unsigned int i = 0; i < grid.x.count(); ++i) columns.insert(grid.x.place(i));
+    };
+    std::set<std::uint32_t> all;
+    for (const GaborPyramid::Grid& grid : grids) add(all, grid);
     std::vector<GaborBank::Scale> scales;
-    for (unsigned int s = params.firstScale; s < params.endScale; ++s)
+    for (unsigned int s = params.firstScale; s < params.endScale; ++s) {
+        std::set<std::uint32_t> own;
+        add(own, grids[s - params.firstScale]);
+        const auto& columns = places == GaborPyramid::Places::ofAllGrids ? all : own;
         scales.push_back({waveNumber(s), {columns.begin(), columns.end()}});
+    }
     return scales;
 }
 
 } // namespace
 
-GaborPyramid::GaborPyramid(const GaborPyramidParams& params)
+GaborPyramid::GaborPyramid(const GaborPyramidParams& params, Places places)
     : params_(params), grids_(makeGrids(params)),
-      bank_(params.width, params.height, scalesOf(params, grids_), params.angles,
+      bank_(params.width, params.height, scalesOf(params, grids_, places), params.angles,
             static_cast<double>(params.sigma), params.filterThreshold) {}
 
 std::size_t GaborPyramid::featureSize() const {

@@ -38,8 +38,11 @@ public:
 
     using Responses = Implementation::GaborBank::Responses;
 
+    /// In which columns a scale responds.
+    enum class Places { ofOwnGrid, ofAllGrids };
+
     /// @throws FNEBadArg for parameters without any filter, scales above 40 or a size that has no transform
-    explicit GaborPyramid(const GaborPyramidParams& params);
+    GaborPyramid(const GaborPyramidParams& params, Places places);
 
     /// @throws FNEBadArg for an image of another size
     Responses respond(const FNImage<float>& image) const { return bank_.respond(image); }

@@ -38,9 +38,7 @@ public:
     explicit Implementation(const Configuration& configuration)
         : Comparison(configuration), population(strategy().algorithm()->createPopulation(0)) {}
 
-    static const Cmp::Population& of(const Population& handle) {
-        return handle.implementation_->population;
-    }
+    static const Cmp::Population& of(const Population& handle) { return handle.implementation_->population; }
 
     Cmp::Population population;
 };
