@@ -313,6 +313,30 @@ TEST_F(ProcessorsWithModels, DevicesDeliverTheImagesThatAreTold) {
               "FNEBadArg: Processor: the capture device is a null handle");
 }
 
+/// A camera that is not there.
+class NoCamera final : public CaptureDeviceBody {
+public:
+    Image capture() override { throw std::range_error("no camera"); }
+};
+
+TEST_F(ProcessorsWithModels, ADeviceThatFailsSaysWhy) {
+    const Configuration c = configuration();
+    const CaptureDevice device(new NoCamera);
+    Calls calls;
+    const std::string reason = "std::exception: no camera";
+    EXPECT_EQ(thrownBy([&] { Enrollment::Processor(c).process(device, enrollment(calls)); }), reason);
+    EXPECT_EQ(thrownBy([&] {
+                  const FIR fir = FIRBuilder(c).buildVoidFIR();
+                  Verification::Processor(c).process(device, fir, 0.5f, verification(calls));
+              }),
+              reason);
+    EXPECT_EQ(thrownBy([&] {
+                  Identification::Processor(c, Population(c)).process(device, 0.5f, identification(calls), 3);
+              }),
+              reason);
+    EXPECT_EQ(calls.text, "start start start ");
+}
+
 class ProcessorsOnPhotos : public ProcessorsWithModels {};
 
 TEST_F(ProcessorsOnPhotos, APhotoIsEnrolledAndRecognized) {

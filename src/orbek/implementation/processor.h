@@ -116,18 +116,34 @@ protected:
             adapt(first, last, [this](const Image& image) { translator_.push(image); });
         attended(feedback, [&] { run(samples); });
     }
-    /// Calls `run(source)` likewise.
+    /// Calls `run(source)` likewise. @throws what the device throws, too, if `run` cannot go on without it
     template <class Feedback, class Run>
     void processDevice(const CaptureDevice& device, const Feedback& feedback, Run run) {
         if (!device) FN_THROW(FNEBadArg, "Processor: the capture device is a null handle");
         const FNMutexLock lock(mutex_);
         translator_.clear();
-        const Fn::VideoSource source(FNCountedPtr<Fn::VideoSource::Body>(new ImageSrc([this, device] {
-            const Image image = device->capture();
-            translator_.push(image);
-            return image;
-        })));
-        attended(feedback, [&] { run(source); });
+        std::exception_ptr failure; // an engine may ask the device on a thread of its own, and know no reason
+        const auto capture = [&] {
+            try {
+                const Image image = device->capture();
+                translator_.push(image);
+                return image;
+            } catch (const std::exception&) { // not the end of a thread
+                failure = std::current_exception();
+                throw;
+            }
+        };
+        const Fn::VideoSource source(FNCountedPtr<Fn::VideoSource::Body>(new ImageSrc(capture)));
+        attended(feedback, [&] {
+            try {
+                run(source);
+            } catch (const typename Translator::Failure&) {
+                throw;
+            } catch (...) {
+                if (failure) std::rethrow_exception(failure);
+                throw;
+            }
+        });
     }
 
 private:
