@@ -1,7 +1,10 @@
 #include "model_files.h"
 
+#include "cmp/portrait/sphar_transformator.h"
 #include "eye/discriminator/cascaded_svm_discriminator.h"
 #include "eye/discriminator/svm_fp_discriminator.h"
+
+#include <fstream>
 
 namespace Orbek::Models {
 namespace {
@@ -24,6 +27,17 @@ void openPolynomial(const std::string& directory, const std::string& name) {
 
 void openHyperbolic(const std::string& directory, const std::string& name) {
     Eye::SVMHyperbolicDiscriminator(directory, name);
+}
+
+void openLighting(const std::string& directory, const std::string& name) {
+    const std::string path = directory + "/" + name;
+    std::ifstream stream(path, std::ios::binary);
+    if (!stream) FN_THROW(FNEIOError, path + ": cannot be opened for reading");
+    try {
+        Cmp::Portrait::SpharTransformator{stream};
+    } catch (const FNException& e) {
+        FN_THROW(FNEBadFormat, path + ": " + e.what());
+    }
 }
 
 constexpr ModelFile table[] = {
@@ -113,7 +127,7 @@ constexpr ModelFile table[] = {
     {"portrait", "age-secondary-2-80.dat", "SVMFPDiscriminator", openPolynomial},
     {"portrait", "age-secondary-2-85.dat", "SVMFPDiscriminator", openPolynomial},
     {"portrait", "age-secondary-2-above.dat", "SVMFPDiscriminator", openPolynomial},
-    {"portrait", "sphartr.dat", "SpharTransformator", nullptr},
+    {"portrait", "sphartr.dat", "SpharTransformator", openLighting},
 };
 
 } // namespace

@@ -78,8 +78,7 @@ int eyes(const Options& options) {
 }
 
 int portrait(const Options& options) {
-    const Eval::PortraitReports reports =
-        Eval::measurePortraits(options.etc, options.selection, options.eyeDistances);
+    const Eval::PortraitReports reports = Eval::measurePortraits(options.etc, options.selection);
     Eval::printPortraits(reports, std::cout);
     if (!options.json.empty()) writeFile(options.json, Eval::portraitsJson(reports));
     return statusOf(reports.failures);

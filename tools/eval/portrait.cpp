@@ -5,7 +5,7 @@
 #include "fn/imagefile/image_file.h"
 #include "img/affine/transform.h"
 #include "img/affine/turns.h"
-#include "labelled/finder_access.h"
+#include "labelled/found_eyes.h"
 #include "labelled/portrait_truth.h"
 
 #include <nlohmann/json.hpp>
@@ -23,6 +23,7 @@ using Cmp::Portrait::Characteristics;
 enum QuestionIndex {
     frontal,
     uniformLight,
+    ordinaryLight,
     eyesOpen,
     eyeOpenByLids,
     gazeFrontal,
@@ -41,6 +42,7 @@ enum QuantityIndex { age, agePerRange, chin, earLeft, earRight };
 PortraitReport emptyReport() {
     return {{{"frontal, against yaw above 20 degrees", -0.42f},
              {"frontal light, against more than 45 degrees", 0.75f},
+             {"light of any frontal portrait", 0.75f},
              {"eyes open (pictures of eyes)", -0.67f},
              {"eye open (by the lids' points)", -0.67f},
              {"gaze frontal (by the iris)", 0.5f},
@@ -72,14 +74,18 @@ public:
     }
 
     void judge(const Labelled::Row& row, const FNImageReference& image) {
-        if (const auto pose = row.number("pose"))
+        if (const auto pose = row.number("pose")) {
             ask(frontal, -portrait_.deviationFromFrontalPose(), *pose == 0);
+            if (*pose == 0) ask(ordinaryLight, -portrait_.deviationFromUniformLighting(), true);
+        }
         if (const auto light = Labelled::frontalLight(row))
             ask(uniformLight, -portrait_.deviationFromUniformLighting(), *light);
         if (const std::string text = row.text("glasses"); !text.empty())
             ask(glasses, portrait_.glasses(), text == "1");
         judgePerson(row);
-        if (const auto points = Labelled::Points68::of(row)) judgePoints(row, *points, image);
+        // Pictures under one lamp have the points of others of the same person.
+        const auto points = Labelled::Points68::of(row);
+        if (points && !row.number("light_azimuth")) judgePoints(row, *points, image);
     }
 
 private:
@@ -161,9 +167,7 @@ Cmp::Face faceOfEye(const FNImage<float>& eye) {
 
 class Measurement {
 public:
-    Measurement(const std::string& etc, const EyeDistances& eyeDistances)
-        : face_(makeFaceFinder(etc)), eyes_(makeEyesFinder(etc, "Tolerant")), analyzer_(makeAnalyzer(etc)),
-          eyeDistances_(eyeDistances) {}
+    explicit Measurement(const std::string& etc) : find_(etc), analyzer_(makeAnalyzer(etc)) {}
 
     /// @return whether our finders found the face; nothing for a row without eyes
     std::optional<bool> judge(const Labelled::Row& row, PortraitReport& report) const {
@@ -175,39 +179,16 @@ public:
         }
         const auto left = row.position("eye_left"), right = row.position("eye_right");
         if (!left || !right || !(left->x < right->x)) return {};
-        FacialFeatureLocation first{*left, 0, 0}, second{*right, 0, 0};
-        const bool found = find(image, first, second);
-        const Characteristics portrait = analyzer_.analyze(Cmp::Face(image, first, second));
+        const auto eyes = find_(image, *left, *right);
+        const Characteristics portrait =
+            analyzer_.analyze(Cmp::Face(image, {eyes.left, 0, 0}, {eyes.right, 0, 0}));
         Judge(portrait, report).judge(row, image);
-        return found;
+        return eyes.found;
     }
 
 private:
-    bool find(const FNImageReference& image, FacialFeatureLocation& left,
-              FacialFeatureLocation& right) const {
-        constexpr float mostOff = 0.25f;
-        const Labelled::FaceTruth truth{left.pos, right.pos, {}, {}, "", true};
-        std::list<FaceFinder::Location> locations;
-        face_.find(image, locations, eyeDistances_.least, eyeDistances_.most, FaceFinder::everywhere);
-        for (const FaceFinder::Location& location : locations) {
-            if (!truth.meantBy(location)) continue;
-            bool foundFirst = false, foundSecond = false;
-            FacialFeatureLocation first, second;
-            eyes_.find(location, image, foundFirst, first, foundSecond, second);
-            const auto near = [&](FNPos a, FNPos b) { return length(a - b) < mostOff * truth.eyeDistance(); };
-            if (!foundFirst || !foundSecond || !near(first.pos, left.pos) || !near(second.pos, right.pos))
-                return false;
-            left = first;
-            right = second;
-            return true;
-        }
-        return false;
-    }
-
-    FaceFinder face_;
-    EyesFinder eyes_;
+    Labelled::EyesAsFound find_;
     Analyzer analyzer_;
-    EyeDistances eyeDistances_;
 };
 
 void addTo(PortraitReport& report, const PortraitReport& more) {
@@ -289,6 +270,7 @@ double Question::bestBalanced() const {
     std::sort(scores.begin(), scores.end());
     constexpr std::size_t steps = 200;
     double best = balanced();
+    if (count(true) == 0 || count(false) == 0) return best;
     for (std::size_t i = 0; i < steps && !scores.empty(); ++i)
         best = std::max(best, balancedAt(*this, scores[i * scores.size() / steps]));
     return best;
@@ -306,8 +288,7 @@ double Quantity::bias() const {
     return sum / static_cast<double>(std::max<std::size_t>(errors.size(), 1));
 }
 
-PortraitReports measurePortraits(const std::string& etc, const Labelled::Selection& selection,
-                                 const EyeDistances& eyeDistances) {
+PortraitReports measurePortraits(const std::string& etc, const Labelled::Selection& selection) {
     std::vector<Labelled::Row> rows;
     for (const std::string& labels : selection.labels)
         for (const Labelled::Row& row : Labelled::readLabels(labels))
@@ -319,7 +300,7 @@ PortraitReports measurePortraits(const std::string& etc, const Labelled::Selecti
         std::string failure;
     };
     std::vector<Judged> judged(rows.size());
-    const Measurement measurement(etc, eyeDistances);
+    const Measurement measurement(etc);
     Labelled::forEachOf(rows.size(), selection.jobs, [&](std::size_t i) {
         try {
             judged[i].found = measurement.judge(rows[i], judged[i].report);

@@ -1,6 +1,6 @@
 #pragma once
 
-#include "eval/detect.h"
+#include "labelled/pictures.h"
 
 #include <map>
 #include <ostream>
@@ -53,8 +53,7 @@ struct PortraitReports {
 };
 
 /// @param etc folder with the trained content of finders and analyser
-PortraitReports measurePortraits(const std::string& etc, const Labelled::Selection& selection,
-                                 const EyeDistances& eyeDistances);
+PortraitReports measurePortraits(const std::string& etc, const Labelled::Selection& selection);
 
 void printPortraits(const PortraitReports& reports, std::ostream& stream);
 std::string portraitsJson(const PortraitReports& reports);

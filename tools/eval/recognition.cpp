@@ -62,7 +62,7 @@ void compareAll(const std::vector<PersonRecord>& probes, const std::vector<Perso
         if (probes[i].record) {
             auto place = places.begin();
             for (const Cmp::Score score : strategy.compare(*probes[i].record, population))
-                scores[*place++] = static_cast<float>(score);
+                scores[*place++] = score.value();
         }
         visit(i, scores);
     });
@@ -272,7 +272,7 @@ VerificationReport verify(const EnrolledPeople& people, const Cmp::Strategy& str
         report.trueAccepts[i] = interval(whole, samples, [i](const Sampled& s) { return s.accepts[i]; });
         report.thresholds[i] = other.threshold(report.rates[i]);
         report.requested[i] =
-            static_cast<float>(strategy.ratesMapping()->requestFAR(static_cast<float>(report.rates[i])));
+            strategy.ratesMapping()->requestFAR(static_cast<float>(report.rates[i])).value();
         report.achieved[i] = other.above(static_cast<float>(report.requested[i]));
     }
     constexpr double least = 1e-5, stepsPerDecade = 20;

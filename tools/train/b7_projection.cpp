@@ -26,8 +26,8 @@ constexpr std::size_t batch = 2048;               ///< samples whose products ar
 constexpr float shrinkage = 0.7f;                 ///< of the mean variance within a person, added to each
 constexpr float floorOfWeights = 2;               ///< in root mean squares of all weights
 constexpr std::size_t mostPicturesThatCount = 10; ///< of one person, for the scatter between persons
-constexpr std::uint32_t rank = 600; ///< of the correction to the diagonal; 400 to 1000 score alike
-constexpr double basisLevels = 8;   ///< standard deviation of the weights of the basis as integers
+constexpr std::uint32_t rank = 800;               ///< of the correction to the diagonal
+constexpr double basisLevels = 6; ///< standard deviation of the weights of the basis as integers
 constexpr double mostLevel = 127, mostSquareLevel = 2047;
 /// Of raw scores of different people; see Cmp::B7::b7NormParams.
 constexpr double impostorDeviation = 4.04;
@@ -225,10 +225,10 @@ SymmMatrix<float> withinPersons(const Matrix<float>& inner, const Groups& person
     return scatter.sum() * (1 / static_cast<float>(samples));
 }
 
-/// Adds the differences of the sets' means, so strongly that nothing of them is left after whitening: how
+/// Adds the differences of the sets' means, so strongly that little of them is left after whitening: how
 /// pictures of a set were taken says nothing about a person.
 void addSets(const Matrix<float>& inner, const Groups& sets, SymmMatrix<float>& within) {
-    constexpr float strength = 100;
+    constexpr float strength = 5;
     for (const auto& [name, members] : sets) {
         std::vector<float> mean = meanOf(inner, members);
         for (float& v : mean) v *= std::sqrt(strength);

@@ -53,7 +53,7 @@ Pixels meanOfSome(const Light& light, std::mt19937_64& random) {
 
 } // namespace
 
-LightingModel trainLighting(const PortraitSet& light, std::mt19937_64& random) {
+SpharTransformator::Data trainLighting(const PortraitSet& light, std::mt19937_64& random) {
     constexpr int means = 4, mixtures = 100;
     constexpr std::size_t fewestPersons = 4;
     constexpr float sigma = 0.15f;
@@ -92,21 +92,20 @@ LightingModel trainLighting(const PortraitSet& light, std::mt19937_64& random) {
         rows.emplace_back(pixels, harmonics);
     }
 
-    LightingModel model{{FNVector<float>(rows.size(), sigma),
-                         Fn::Matrix<float>(rows.size(), rows.front().first.size()),
-                         Fn::Matrix<float>(rows.size(), SpharTransformator::coefficients)}};
+    SpharTransformator::Data data{FNVector<float>(rows.size(), sigma),
+                                  Fn::Matrix<float>(rows.size(), rows.front().first.size()),
+                                  Fn::Matrix<float>(rows.size(), SpharTransformator::coefficients)};
     for (std::size_t r = 0; r < rows.size(); ++r) {
         // Seven bits of each pixel; the reader brings images to one length.
         constexpr double levels = 127;
         const auto& [pixels, harmonics] = rows[r];
         const double greatest = *std::max_element(pixels.begin(), pixels.end());
         for (std::size_t k = 0; k < pixels.size(); ++k)
-            model.data.images(r, k) =
-                static_cast<float>(std::round(pixels[k] * levels / std::max(greatest, 1e-6)));
+            data.images(r, k) = static_cast<float>(std::round(pixels[k] * levels / std::max(greatest, 1e-6)));
         for (std::size_t k = 0; k < harmonics.size(); ++k)
-            model.data.coefficientRows(r, k) = static_cast<float>(harmonics[k]);
+            data.coefficientRows(r, k) = static_cast<float>(harmonics[k]);
     }
-    return model;
+    return data;
 }
 
 FNImage<float> lightingWindow(std::span<const float> columns) {

@@ -4,8 +4,7 @@
 #include "fn/imagefile/image_file.h"
 #include "img/affine/transform.h"
 #include "img/affine/turns.h"
-#include "labelled/finder_access.h"
-#include "labelled/pictures.h"
+#include "labelled/found_eyes.h"
 #include "labelled/portrait_truth.h"
 #include "train/sign_matrix.h"
 
@@ -93,40 +92,7 @@ Values irisOffsets(const Labelled::Row& row, const FNImageReference& image) {
             points->irisOffset(gray, Labelled::Side::right).value_or(unseen)};
 }
 
-struct Eyes {
-    FNPos left, right;
-    bool found;
-};
-
-class Finders {
-public:
-    explicit Finders(const std::filesystem::path& etc)
-        : face_(Labelled::makeFaceFinder(etc)), eyes_(Labelled::makeEyesFinder(etc, "Tolerant")) {}
-
-    /// What is found of the labelled face, else the label.
-    Eyes find(const FNImageReference& image, const Eyes& label) const {
-        constexpr double least = 0.05, most = 0.65;
-        constexpr float mostOff = 0.25f;
-        std::list<FaceFinder::Location> locations;
-        face_.find(image, locations, least, most, FaceFinder::everywhere);
-        const Labelled::FaceTruth truth{label.left, label.right, {}, {}, "", true};
-        for (const FaceFinder::Location& location : locations) {
-            if (!truth.meantBy(location)) continue;
-            bool foundFirst = false, foundSecond = false;
-            FacialFeatureLocation first, second;
-            eyes_.find(location, image, foundFirst, first, foundSecond, second);
-            const float limit = mostOff * truth.eyeDistance();
-            if (foundFirst && foundSecond && length(first.pos - label.left) < limit &&
-                length(second.pos - label.right) < limit && first.pos.x < second.pos.x)
-                return {first.pos, second.pos, true};
-        }
-        return label;
-    }
-
-private:
-    FaceFinder face_;
-    EyesFinder eyes_;
-};
+using Eyes = Labelled::EyesAsFound::Eyes;
 
 Cmp::Face faceOf(const FNImageReference& image, const Eyes& eyes) {
     return {image, {eyes.left, 0, 0}, {eyes.right, 0, 0}};
@@ -180,7 +146,7 @@ public:
 
     void extractFaces(const std::vector<PortraitKind>& kinds, std::size_t most) {
         clear();
-        const Finders finders(sources_.etc);
+        const Labelled::EyesAsFound find(sources_.etc);
         const std::size_t step = (set_.rows.size() + most - 1) / most;
         for (std::size_t r = 0; r < set_.rows.size(); r += std::max<std::size_t>(step, 1)) {
             const Labelled::Row& row = set_.rows[r];
@@ -189,7 +155,7 @@ public:
             const Labelled::Split split = Labelled::splitOf(row.splitKey());
             const Eyes label{*left, *right, false};
             const FNImageReference image = Fn::readImage(row.image().string());
-            const Eyes eyes = finders.find(image, label), moved = jittered(label, random_);
+            const Eyes eyes = find(image, *left, *right), moved = jittered(label, random_);
             const bool twice = split == Labelled::Split::train;
             const Values iris = irisOffsets(row, image);
             add({r, split, false, eyes.left, eyes.right, eyes.found}, faceOf(image, eyes), kinds, iris);

@@ -99,15 +99,17 @@ double QuadraticRegression::kernel(double product) const {
     return (product + kernelConstant) * (product + kernelConstant);
 }
 
-std::vector<float> QuadraticRegression::solve(const std::vector<std::size_t>& chosen,
-                                              const std::vector<float>& targets,
-                                              const std::vector<float>& weights, double penalty) const {
+template <class Kernel>
+std::vector<float>
+QuadraticRegression::ridge(const std::vector<std::size_t>& chosen, const std::vector<float>& targets,
+                           const std::vector<float>& weights, double penalty, Kernel kernelOf) const {
     constexpr int steps = 80;
     const std::size_t m = chosen.size();
     std::vector<float> k(m * m), diagonal(m);
     for (std::size_t j = 0; j < m; ++j) {
         for (std::size_t i = 0; i < m; ++i)
-            k[j * m + i] = static_cast<float>(kernel(static_cast<double>(gram_[chosen[j] * n_ + chosen[i]])));
+            k[j * m + i] =
+                static_cast<float>(kernelOf(static_cast<double>(gram_[chosen[j] * n_ + chosen[i]])));
         diagonal[j] = static_cast<float>(penalty) / weights[j];
     }
     return conjugateGradients(targets, steps, [&](const std::vector<float>& v) {
@@ -116,6 +118,12 @@ std::vector<float> QuadraticRegression::solve(const std::vector<std::size_t>& ch
         for (std::size_t i = 0; i < m; ++i) image[i] += diagonal[i] * v[i];
         return image;
     });
+}
+
+std::vector<float> QuadraticRegression::solve(const std::vector<std::size_t>& chosen,
+                                              const std::vector<float>& targets,
+                                              const std::vector<float>& weights, double penalty) const {
+    return ridge(chosen, targets, weights, penalty, [&](double product) { return kernel(product); });
 }
 
 double QuadraticRegression::predict(const std::vector<std::size_t>& chosen,
@@ -207,19 +215,9 @@ QuadraticFunction QuadraticRegression::reduced(const std::vector<std::size_t>& c
 QuadraticFunction QuadraticRegression::linearFit(const std::vector<std::size_t>& chosen,
                                                  const std::vector<float>& targets,
                                                  const std::vector<float>& weights, double penalty) const {
-    constexpr int steps = 80;
+    const std::vector<float> duals =
+        ridge(chosen, targets, weights, penalty, [](double product) { return product + 1; });
     const std::size_t m = chosen.size();
-    std::vector<float> k(m * m), diagonal(m);
-    for (std::size_t j = 0; j < m; ++j) {
-        for (std::size_t i = 0; i < m; ++i) k[j * m + i] = gram_[chosen[j] * n_ + chosen[i]] + 1;
-        diagonal[j] = static_cast<float>(penalty) / weights[j];
-    }
-    const std::vector<float> duals = conjugateGradients(targets, steps, [&](const std::vector<float>& v) {
-        std::vector<float> image(m);
-        Blas::gemv(true, m, m, 1, k.data(), v.data(), 0, image.data());
-        for (std::size_t i = 0; i < m; ++i) image[i] += diagonal[i] * v[i];
-        return image;
-    });
     QuadraticFunction function;
     std::vector<double> linear(d_);
     for (std::size_t j = 0; j < m; ++j) {

@@ -58,6 +58,9 @@ public:
 
 private:
     double kernel(double product) const;
+    template <class Kernel>
+    std::vector<float> ridge(const std::vector<std::size_t>& chosen, const std::vector<float>& targets,
+                             const std::vector<float>& weights, double penalty, Kernel kernelOf) const;
     /// `linear * z` of standardised features z added to a function of features as they are.
     void addLinear(QuadraticFunction& function, const std::vector<double>& linear) const;
 

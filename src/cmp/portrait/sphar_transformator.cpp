@@ -17,6 +17,11 @@ FNVector<float> ofUnitLength(const FNVector<float>& vector) {
     return length > 0 ? vector / length : vector;
 }
 
+void requireFinite(std::span<const float> values) {
+    if (!std::all_of(values.begin(), values.end(), [](float v) { return std::isfinite(v); }))
+        FN_THROW(FNEBadArg, "SpharTransformator: value that is no number");
+}
+
 FNVector<float> columnsOf(const FNImage<float>& image) {
     FNVector<float> columns(image.size());
     float* out = columns.getExclusive();
@@ -44,6 +49,9 @@ SpharTransformator::SpharTransformator(const Data& data)
     if (data.images.cols() != pixels || sigmas_.size() != n || coefficientRows_.rows() != n ||
         coefficientRows_.cols() != coefficients)
         FN_THROW(FNEBadArg, "SpharTransformator: images, sigmas and coefficients that do not fit each other");
+    requireFinite(sigmas_.span());
+    requireFinite({data.images.get(), data.images.size()});
+    requireFinite({coefficientRows_.get(), coefficientRows_.size()});
     for (std::size_t i = 0; i < n; ++i) images_.column(i, ofUnitLength(data.images.row(i)));
 }
 
