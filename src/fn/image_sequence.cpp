@@ -74,6 +74,27 @@ private:
     FNEvent event_;
 };
 
+namespace {
+
+class InTurn final : public Fn::VideoSource::Body {
+public:
+    explicit InTurn(const std::list<Fn::VideoSource>& sources) : sources_(sources) {
+        if (sources_.empty()) FN_THROW(FNEBadArg, "Cannot work with empty Image Source List");
+    }
+
+    FNImageReference get() override {
+        sources_.splice(sources_.end(), sources_, sources_.begin());
+        return sources_.back().get();
+    }
+    /// Of the source that has given the last frame.
+    std::string name() override { return sources_.back().name(); }
+
+private:
+    std::list<Fn::VideoSource> sources_; ///< the next one first
+};
+
+} // namespace
+
 /// The thread that takes the frames, and the sequences that are not complete.
 class FNImageSequenceFactory::Loop {
 public:
@@ -84,6 +105,7 @@ public:
     }
     ~Loop() {
         thread_.requestCancel();
+        opened_.signal(); // it may never have been
         thread_.join();
     }
     Loop(const Loop&) = delete;
@@ -94,6 +116,7 @@ public:
         const Fn::ModifierLock lock(open_);
         if (ended_) return false;
         sequences_.push_back(sequence);
+        opened_.signal();
         return true;
     }
 
@@ -111,6 +134,8 @@ private:
 
     void run() {
         const End end{*this};
+        opened_.wait(); // a frame that nobody waits for would be lost
+        FNThreadSelf::serviceCancel();
         for (;;) {
             const Clock::time_point start = Clock::now();
             FNImageReference frame = source_.get();
@@ -135,11 +160,17 @@ private:
     Fn::FairResource open_; ///< guards the next two
     std::list<FNCountedPtr<FNImageSequence>> sequences_;
     bool ended_ = false;
+    FNEvent opened_; ///< signalled for each sequence
     FNThread thread_;
 };
 
 FNImageSequenceFactory::FNImageSequenceFactory(const Fn::VideoSource& source, unsigned int intervalMs)
     : loop_(std::make_unique<Loop>(source, intervalMs)) {}
+
+FNImageSequenceFactory::FNImageSequenceFactory(const std::list<Fn::VideoSource>& sources,
+                                               unsigned int intervalMs)
+    : FNImageSequenceFactory(Fn::VideoSource(FNCountedPtr<Fn::VideoSource::Body>(new InTurn(sources))),
+                             intervalMs) {}
 
 FNImageSequenceFactory::~FNImageSequenceFactory() = default;
 

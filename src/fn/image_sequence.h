@@ -2,6 +2,7 @@
 
 #include "fn/video_source.h"
 
+#include <list>
 #include <memory>
 #include <utility>
 
@@ -38,14 +39,16 @@ private:
     FNCountedPtr<FNImageSequence> sequence_;
 };
 
-/// Takes frames from a source, on a thread that lives as long as this. A source that fails ends the thread
-/// and with it all sequences.
+/// Takes frames from a source, on a thread that lives as long as this, from the first start() on. A source
+/// that fails ends the thread and with it all sequences.
 class FNImageSequenceFactory {
 public:
     /// @param source gives a fresh reference for each frame, which gets the time as its attribute
     /// "CaptureTime"
     /// @param intervalMs least time from one frame to the next, milliseconds
     FNImageSequenceFactory(const Fn::VideoSource& source, unsigned int intervalMs);
+    /// Several sources take turns, in their order, one at each frame. @throws FNEBadArg if there is none
+    FNImageSequenceFactory(const std::list<Fn::VideoSource>& sources, unsigned int intervalMs);
     /// Waits for the frame that is being taken; sequences are complete with what they hold.
     ~FNImageSequenceFactory();
     FNImageSequenceFactory(const FNImageSequenceFactory&) = delete;

@@ -16,11 +16,17 @@ enum ExitStatus : int {
 /// A command of the program.
 struct Command {
     CLI::App* app;            ///< its options
-    std::function<int()> run; ///< @return an ExitStatus. @throws std::exception for what stops it
+    std::function<int()> run; ///< @return the exit status. @throws std::exception for what stops it
+    int stopped = failed;     ///< exit status of what is stopped
 };
 
 /// Each adds one command to the program, and lives in a file of its own.
+Command compareCommand(CLI::App& program);
+Command enrolCommand(CLI::App& program);
 Command findCommand(CLI::App& program);
+Command mergeCommand(CLI::App& program);
+Command showCommand(CLI::App& program);
 Command trackCommand(CLI::App& program);
+Command verifyCommand(CLI::App& program);
 
 } // namespace Orbek::Tool

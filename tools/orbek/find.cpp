@@ -70,17 +70,10 @@ std::vector<FoundFace> Finders::find(const Image& image, const FindOptions& opti
     return found;
 }
 
-Json placeJson(float x, float y, float confidence) {
-    return {rounded(x, 2), rounded(y, 2), rounded(confidence, 4)};
-}
-
 Json faceJson(const FoundFace& found) {
     Json json;
     addFace(json, found.face);
-    if (const auto& eyes = found.eyes) {
-        json["eyes"]["left"] = placeJson(eyes->first.x, eyes->first.y, eyes->firstConfidence);
-        json["eyes"]["right"] = placeJson(eyes->second.x, eyes->second.y, eyes->secondConfidence);
-    }
+    if (found.eyes) json["eyes"] = eyesJson(*found.eyes);
     if (const auto& mouth = found.mouth)
         json["mouth"] = placeJson(mouth->pos.x, mouth->pos.y, mouth->confidence);
     if (const auto& bridge = found.bridge)

@@ -2,31 +2,36 @@
 
 #include "command.h"
 
+#include <algorithm>
 #include <iostream>
 #include <vector>
 
 using namespace Orbek::Tool;
 
 int main(int argc, char** argv) {
-    CLI::App program("Finds and tracks faces in images. Results are printed as JSON, one object a line.\n"
-                     "Exit status: 0 done, 1 failed, 2 an input could not be read (the others are done).",
-                     "orbek");
+    CLI::App program(
+        "Finds, tracks and recognizes faces in images. Results are printed as JSON, one object a line.\n"
+        "Exit status: 0 done, 1 failed, 2 an input could not be read (the others are done).",
+        "orbek");
     program.require_subcommand(1);
-    const std::vector<Command> commands = {findCommand(program), trackCommand(program)};
+    const std::vector<Command> commands = {
+        enrolCommand(program),   verifyCommand(program), showCommand(program), mergeCommand(program),
+        compareCommand(program), findCommand(program),   trackCommand(program)};
+    const auto parsed = [&] {
+        return std::ranges::find_if(commands, [](const Command& command) { return command.app->parsed(); });
+    };
+    const auto stopped = [&] { return parsed() == commands.end() ? failed : parsed()->stopped; };
     try {
         program.parse(argc, argv);
     } catch (const CLI::ParseError& e) {
-        return program.exit(e) == 0 ? done : failed;
+        return program.exit(e) == 0 ? done : stopped();
     }
     try {
-        for (const Command& command : commands)
-            if (command.app->parsed()) {
-                const int status = command.run();
-                if (std::cout.flush()) return status;
-                throw std::runtime_error("cannot write the results");
-            }
+        const int status = parsed()->run();
+        if (std::cout.flush()) return status;
+        throw std::runtime_error("cannot write the results");
     } catch (const std::exception& e) {
         std::cerr << "orbek: " << e.what() << std::endl;
     }
-    return failed;
+    return stopped();
 }

@@ -30,10 +30,10 @@ void Output::result(const nlohmann::ordered_json& json) {
     drawBar();
 }
 
-void Output::complaint(const std::string& file, const std::string& reason) {
+void Output::complaint(const std::string& text) {
     const std::lock_guard lock(mutex_);
     removeBar();
-    std::cerr << "orbek: " << file << ": " << reason << std::endl;
+    std::cerr << "orbek: " << text << std::endl;
     complained_ = true;
     drawBar();
 }
@@ -63,6 +63,15 @@ void Output::drawBar() {
 double rounded(double value, int decimals) {
     const double unit = std::pow(10.0, decimals);
     return std::round(value * unit) / unit;
+}
+
+nlohmann::ordered_json placeJson(float x, float y, float confidence) {
+    return {rounded(x, 2), rounded(y, 2), rounded(confidence, 4)};
+}
+
+nlohmann::ordered_json eyesJson(const Eyes::Location& eyes) {
+    return {{"left", placeJson(eyes.first.x, eyes.first.y, eyes.firstConfidence)},
+            {"right", placeJson(eyes.second.x, eyes.second.y, eyes.secondConfidence)}};
 }
 
 void addFace(nlohmann::ordered_json& json, const Face::Location& face) {

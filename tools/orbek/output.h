@@ -1,5 +1,6 @@
 #pragma once
 
+#include "orbek/eyes_finder.h"
 #include "orbek/face_finder.h"
 
 #include <cstddef>
@@ -22,7 +23,8 @@ public:
     Output& operator=(const Output&) = delete;
 
     void result(const nlohmann::ordered_json& json);
-    void complaint(const std::string& file, const std::string& reason);
+    void complaint(const std::string& text);
+    void complaint(const std::string& file, const std::string& reason) { complaint(file + ": " + reason); }
     /// One more step is done.
     void step();
     /// Whether there was a complaint.
@@ -41,6 +43,11 @@ private:
 
 /// A number as results show it, with so many decimals at most.
 double rounded(double value, int decimals);
+
+/// A position and its confidence.
+nlohmann::ordered_json placeJson(float x, float y, float confidence);
+/// The places of both.
+nlohmann::ordered_json eyesJson(const Eyes::Location& eyes);
 
 /// Adds x, y, eye_distance, confidence and rotation.
 void addFace(nlohmann::ordered_json& json, const Face::Location& face);

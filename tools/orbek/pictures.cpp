@@ -3,6 +3,7 @@
 #include "fn/imagefile/image_file.h"
 #include "fn/imagefile/jpeg.h"
 #include "img/affine/turns.h"
+#include "orbek/implementation/adapt.h"
 
 #include <algorithm>
 #include <array>
@@ -94,6 +95,10 @@ FNImageReference readUpright(const fs::path& file) {
     std::ifstream stream(file, std::ios::binary);
     const Orientation orientation = orientationInJpeg(stream);
     return upright(Fn::readImage(file.string()), orientation);
+}
+
+Image readPicture(const fs::path& file) {
+    return adapt(readUpright(file), file.string());
 }
 
 PictureFolder::PictureFolder(const std::string& folder, const std::vector<fs::path>& sources) {

@@ -2,6 +2,7 @@
 
 #include "exif.h"
 #include "fn/image_reference.h"
+#include "orbek/image.h"
 
 #include <filesystem>
 #include <string>
@@ -23,6 +24,8 @@ FNImageReference upright(const FNImageReference& image, Orientation orientation)
 /// Reads a file of any format that the library knows, and turns it upright.
 /// @throws std::exception that tells what is wrong
 FNImageReference readUpright(const std::filesystem::path& file);
+/// The same as a public image, which has the file's name.
+Image readPicture(const std::filesystem::path& file);
 
 /// A folder for pictures that are drawn into.
 class PictureFolder {

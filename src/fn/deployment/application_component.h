@@ -37,6 +37,9 @@ public:
     void setWriteHook(const Functor1<std::string>& hook) override;
     void removeWriteHook() override;
 
+    /// The database that holds the values of the tree.
+    const FNCountedPtr<AppConfigDB>& db() const { return resources_->primary; }
+
 private:
     /// A value that a type imposes, and the depth of the node that has this type.
     struct TypeDefault {

@@ -81,6 +81,8 @@ public:
     void setWriteHook(const Functor1<std::string>& hook) { body_->setWriteHook(hook); }
     void removeWriteHook() { body_->removeWriteHook(); }
 
+    const Body& body() const { return *body_; }
+
 private:
     FNCountedPtr<Body> body_;
 };

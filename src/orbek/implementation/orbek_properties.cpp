@@ -7,6 +7,12 @@
 #include "eye/tracker/reference_face_tracker.h"
 #include "fg/capture_types.h"
 #include "fn/deployment/composite_values.h"
+#include "kx/set_enroller.h"
+#include "kx/set_identifier.h"
+#include "kx/set_recognizer.h"
+#include "kx/stream_enroller.h"
+#include "kx/stream_identifier.h"
+#include "kx/stream_recognizer.h"
 
 namespace Orbek {
 
@@ -46,12 +52,12 @@ std::list<Property> members() {
         property<Eye::Cara::T8::FaceFinder>::create("FaceFinder", "Face Finder"),
         property<Eye::Ojo::T8::EyesFinder>::create("EyesFinder", "Eyes Finder to use."),
         property<ComparisonModule>::create("ComparisonAlgorithm", "Type of Comparison Algorithm"),
-        pending("SetEnroller", "Kx::SetEnroller", "Set Enroller"),
-        pending("StreamEnroller", "Kx::StreamEnroller", "Stream Enroller"),
-        pending("StreamVerifier", "Kx::StreamRecognizer", "Stream Verifier"),
-        pending("StreamIdentifier", "Kx::StreamIdentifier", "Stream Identifier"),
-        pending("SetVerifier", "Kx::SetRecognizer", "Set Verifier"),
-        pending("SetIdentifier", "Kx::SetIdentifier", "Set Identifier"),
+        property<Kx::SetEnroller>::create("SetEnroller", "Set Enroller"),
+        property<Kx::StreamEnroller>::create("StreamEnroller", "Stream Enroller"),
+        property<Kx::StreamRecognizer>::create("StreamVerifier", "Stream Verifier"),
+        property<Kx::StreamIdentifier>::create("StreamIdentifier", "Stream Identifier"),
+        property<Kx::SetRecognizer>::create("SetVerifier", "Set Verifier"),
+        property<Kx::SetIdentifier>::create("SetIdentifier", "Set Identifier"),
         property<Eye::ReferenceFaceTracker>::create("FaceTracker", "Face Tracker Engine"),
         property<Cmp::Portrait::Analyzer>::create("PortraitAnalyzer", "Portrait Analyzer"),
         pending("ISOFullFrontalTest", "Kx::ISO_19794_5::FullFrontal::Test",

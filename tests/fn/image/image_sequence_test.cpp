@@ -54,6 +54,23 @@ TEST(ImageSequence, GivesFramesInOrderAndThenEnds) {
               "FNEBadFunCall: FNImageSequenceIter::*(): tried to get image beyond end");
 }
 
+TEST(ImageSequence, SeveralSourcesTakeTurns) {
+    const Counting one(endless), other(2);
+    FNImageSequenceFactory factory({one.source, other.source}, 0);
+    auto [frame, end] = factory.start(1000000);
+    std::string widths;
+    for (; frame != end; ++frame) widths += std::to_string((*frame).w()) + " ";
+    EXPECT_EQ(widths, "1 1 2 2 3 ") << "from the first frame of each to the failure of one";
+    EXPECT_EQ(thrownBy([] { FNImageSequenceFactory(std::list<Fn::VideoSource>{}, 1); }),
+              "FNEBadArg: Cannot work with empty Image Source List");
+}
+
+TEST(ImageSequence, NoFrameIsTakenBeforeThereIsASequence) {
+    const Counting camera(endless);
+    { const FNImageSequenceFactory factory(camera.source, 0); }
+    EXPECT_EQ(camera.body->count_, 0u);
+}
+
 TEST(ImageSequence, ASequenceWithoutTimeHasOneFrame) {
     const Counting camera(endless);
     FNImageSequenceFactory factory(camera.source, 1);

@@ -1,0 +1,33 @@
+#pragma once
+
+#include "cmp/face/face.h"
+#include "cmp/sample.h"
+#include "fn/optional.h"
+
+namespace Kx {
+
+/// One picture of a person, with what is known of it: what operations take. Copies share what is in it.
+struct SensorSample {
+    explicit SensorSample(const FNImageReference& picture) : image(picture) {}
+    SensorSample(const FNImageReference& picture, const FacialFeatureLocation& left,
+                 const FacialFeatureLocation& right)
+        : image(picture), leftEye(left), rightEye(right) {}
+
+    bool hasEyes() const { return leftEye.isSet() && rightEye.isSet(); }
+
+    /// What goes into a record builder: of two kinds of 3D data the point set, and the eyes in space if both
+    /// are there. @throws FNEBadFunCall without both eyes; so does face()
+    Cmp::Sample cmpSample() const;
+    /// The image with both eyes.
+    Cmp::Face face() const;
+
+    FNImageReference image;
+    Fn::Optional<FacialFeatureLocation> leftEye;
+    Fn::Optional<FacialFeatureLocation> rightEye;
+    FNCountedPtr<Fn::VertexImage> vertexImage;           ///< may be null
+    FNCountedPtr<ShapeImage::TexturedPointSet> pointSet; ///< may be null
+    Fn::Optional<FN3Vector<double>> firstEye3D; ///< in the coordinates of the 3D data; so is the next one
+    Fn::Optional<FN3Vector<double>> secondEye3D;
+};
+
+} // namespace Kx

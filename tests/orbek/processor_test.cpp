@@ -1,0 +1,360 @@
+#include "cmp/b7_setup.h"
+#include "cmp/mapping_files.h"
+#include "drawn_image.h"
+#include "orbek/enrollment.h"
+#include "orbek/fir_builder.h"
+#include "orbek/identification.h"
+#include "orbek/image_io.h"
+#include "orbek/implementation/adapt_sample.h"
+#include "orbek/implementation/adapt_shape.h"
+#include "orbek/verification.h"
+#include "support/labelled_photos.h"
+#include "support/thrown.h"
+
+#include <gtest/gtest.h>
+
+namespace Orbek {
+namespace {
+
+// ---- samples
+
+TEST(AdaptSample, CarriesWhatIsSetInBothDirections) {
+    Sample sample(grayPattern(4, 3));
+    EXPECT_FALSE(adapt(sample).hasEyes());
+    EXPECT_FALSE(adapt(adapt(sample)).eyes.isSet());
+    sample.eyes.set({{1, 2}, {3, 4}, 0.5f, 0.25f});
+    const Vertex points[] = {{1, 2, 3}, {4, 5, 6}};
+    const bool mask[] = {true, false};
+    sample.vertexImage.set(createImageBody(points, mask, 2, 1, false));
+    sample.pointSet.set(adapt(::ShapeImage::TexturedPointSet()));
+    sample.secondEye3D.set({7, 8, 9});
+    const Kx::SensorSample inner = adapt(sample);
+    EXPECT_EQ(inner.rightEye->pos, (FNPos{3, 4}));
+    EXPECT_EQ(inner.leftEye->confidence, 0.5f);
+    EXPECT_EQ(inner.vertexImage->vertex({0, 0}).z, 3);
+    EXPECT_TRUE(inner.pointSet);
+    EXPECT_FALSE(inner.secondEye3D.isSet()) << "counts with the first only";
+    sample.firstEye3D.set({1, 1, 1});
+    const Sample back = adapt(adapt(sample));
+    EXPECT_EQ(back.eyes.value().second, (Position{3, 4}));
+    EXPECT_EQ(back.secondEye3D.value().y, 8);
+    EXPECT_TRUE(back.pointSet.isSet());
+    EXPECT_EQ(back.vertexImage.value()->width(), 2u);
+
+    Sample half(grayPattern(1, 1));
+    half.firstEye3D.set({1, 1, 1});
+    EXPECT_EQ(thrownBy([&] { adapt(half); }),
+              "std::exception: Attempt to retrieve Sample item Eye13D which is not set");
+    Kx::SensorSample oneEyed(FNImageReference{});
+    oneEyed.leftEye = FacialFeatureLocation();
+    EXPECT_EQ(thrownBy([&] { adapt(oneEyed); }), "FNEBadFunCall: Optional data accessed but not set!");
+}
+
+// ---- feedbacks
+
+struct Calls {
+    std::string text;
+    std::vector<Image> images;
+    std::vector<FIR> firs;
+    std::vector<float> scores;
+    std::function<void(const std::string&)> atEach = [](const std::string&) {};
+
+    void add(const std::string& call) {
+        text += call + " ";
+        atEach(call);
+    }
+};
+
+/// Writes down what it is told.
+template <class Body> class Told : public Body {
+public:
+    explicit Told(Calls& calls) : calls_(calls) {}
+    void start() override { calls_.add("start"); }
+    void processingImage(const Image& image) override {
+        calls_.images.push_back(image);
+        calls_.add("image");
+    }
+    void eyesFound(const Eyes::Location& eyes) override {
+        calls_.add("eyes" + std::to_string(static_cast<int>(eyes.first.x)));
+    }
+    void eyesNotFound() override { calls_.add("blind"); }
+    void end() override { calls_.add("end"); }
+
+protected:
+    Calls& calls_;
+};
+
+class EnrollmentTold final : public Told<Enrollment::FeedbackBody> {
+public:
+    using Told::Told;
+    void success(const FIR& fir) override {
+        calls_.firs.push_back(fir);
+        calls_.add("success");
+    }
+    void failure() override { calls_.add("failure"); }
+};
+Enrollment::Feedback enrollment(Calls& calls) {
+    return Enrollment::Feedback(new EnrollmentTold(calls));
+}
+
+class VerificationTold final : public Told<Verification::FeedbackBody> {
+public:
+    using Told::Told;
+    void score(const Score& score) override {
+        calls_.scores.push_back(score);
+        calls_.add("score");
+    }
+    void match() override { calls_.add("match"); }
+    void noMatch() override { calls_.add("noMatch"); }
+};
+Verification::Feedback verification(Calls& calls) {
+    return Verification::Feedback(new VerificationTold(calls));
+}
+
+class IdentificationTold final : public Told<Identification::FeedbackBody> {
+public:
+    using Told::Told;
+    void matches(const std::list<Match>& matches) override {
+        std::string names = "matches:";
+        for (const Match& match : matches) {
+            names += match.name;
+            calls_.scores.push_back(match.score);
+        }
+        calls_.add(names);
+    }
+};
+Identification::Feedback identification(Calls& calls) {
+    return Identification::Feedback(new IdentificationTold(calls));
+}
+
+/// A camera that sees no face, and remembers what it has delivered.
+class EmptyRoom final : public CaptureDeviceBody {
+public:
+    explicit EmptyRoom(std::vector<Image>& delivered) : delivered_(delivered) {}
+    Image capture() override {
+        delivered_.push_back(grayPattern(40, 30));
+        return delivered_.back();
+    }
+
+private:
+    std::vector<Image>& delivered_;
+};
+
+// ---- processors
+
+/// The comparison has random weights, and a mapping from raw scores of 0 to 4000 to scores.
+class ProcessorsWithModels : public B7Setup {
+protected:
+    static void SetUpTestSuite() {
+        B7Setup::SetUpTestSuite();
+        const auto write = [](const char* name, float first, float last, float xMax) {
+            const Fn::InvertibleFunction<float, float> mapping(FNVector<float>(std::vector{first, last}), 0,
+                                                               xMax);
+            Cmp::Implementation::writeMappingFile(mapping, folder().file(name));
+        };
+        write("smap-b7.dat", 0, 1, 4000);
+        write("farmap-b7.dat", 1, 0, 1);
+        write("frrmap-b7.dat", 0, 1, 1);
+    }
+
+    static Configuration configuration(const std::string& more = {}) {
+        const std::string b7 = "ORBEK.ComparisonAlgorithm.AlgorithmVersion.B7.";
+        std::istringstream text("ORBEK.Substitutions.INSTALLDIR = " ORBEK_BINARY_DIR "\n" + b7 +
+                                "DataDir = " + folder().path().string() + "\n" + b7 +
+                                "SampleSelector.SampleEvaluator.RegardDeviationFromFrontalPose = false\n" +
+                                more);
+        return Configuration(text);
+    }
+
+    /// A picture with eyes. @param seed pictures of other numbers show somebody else
+    static Sample person(unsigned int seed) {
+        std::mt19937 random(seed);
+        std::vector<unsigned char> pixels(160 * 160);
+        for (std::size_t i = 0; i < pixels.size(); ++i)
+            pixels[i] = static_cast<unsigned char>(
+                128 + 60 * std::sin(static_cast<double>(i % 160) / (4 + seed)) + random() % 40);
+        return Sample(std::pair(Image(new DrawnImage(160, 160, pixels)),
+                                Orbek::Eyes::Location{{50, 60}, {110, 60}, 1, 1}));
+    }
+    static FIR record(const Configuration& c, const std::list<Sample>& samples) {
+        Calls calls;
+        Enrollment::Processor(c).process(samples.begin(), samples.end(), enrollment(calls));
+        return calls.firs.at(0);
+    }
+};
+
+TEST_F(ProcessorsWithModels, AnEnrollmentTellsOfItsImagesInTheirOrder) {
+    const Enrollment::Processor processor(configuration());
+    Calls calls;
+    const std::list<Sample> samples{person(1), Sample(grayPattern(60, 50)), person(2)};
+    processor.process(samples.begin(), samples.end(), enrollment(calls));
+    EXPECT_EQ(calls.text, "start image eyes50 image blind image eyes50 success end ");
+    ASSERT_EQ(calls.images.size(), 3u);
+    EXPECT_EQ(calls.images[1], std::next(samples.begin())->image) << "the application's own";
+    EXPECT_EQ(calls.images[2], samples.back().image);
+
+    Calls none;
+    processor.process(samples.end(), samples.end(), enrollment(none));
+    EXPECT_EQ(none.text, "start failure end ");
+    processor.process(samples.begin(), samples.end(), Enrollment::Feedback());
+    EXPECT_EQ(thrownBy([&] {
+                  const std::list<Sample> null{person(1), Sample(Image())};
+                  processor.process(null.begin(), null.end(), enrollment(none));
+              }).substr(0, 9),
+              "FNEBadArg");
+    EXPECT_EQ(none.text, "start failure end ") << "a sample that cannot be used fails before the start";
+    processor.process(std::next(samples.begin()), samples.end(), enrollment(none));
+    EXPECT_EQ(none.images.front(), calls.images[1]) << "and leaves no image behind";
+}
+
+TEST_F(ProcessorsWithModels, WhatAFeedbackThrowsEndsTheProcess) {
+    const Enrollment::Processor processor(configuration());
+    const std::list<Sample> samples{person(1), person(2)};
+    for (const char* call : {"start", "eyes50", "success", "end"}) {
+        Calls broken, sound;
+        broken.atEach = [&](const std::string& now) {
+            if (now == call) throw std::out_of_range(call);
+        };
+        EXPECT_THROW(processor.process(samples.begin(), samples.end(), enrollment(broken)),
+                     std::out_of_range);
+        EXPECT_TRUE(broken.text.ends_with(std::string(call) + " ")) << broken.text;
+        const std::string before = broken.text;
+        processor.process(std::next(samples.begin()), samples.end(), enrollment(sound));
+        EXPECT_EQ(sound.text, "start image eyes50 success end ");
+        EXPECT_EQ(sound.images.front(), samples.back().image);
+        EXPECT_EQ(broken.text, before);
+    }
+}
+
+TEST_F(ProcessorsWithModels, AFeedbackMayUseTheProcessor) {
+    const Enrollment::Processor processor(configuration());
+    const std::list<Sample> samples{person(1)};
+    Calls calls, inner;
+    std::size_t merged = 0;
+    calls.atEach = [&](const std::string& now) {
+        if (now != "success") return;
+        merged = processor.merge(calls.firs[0], calls.firs[0]).flatSize();
+        processor.process(samples.begin(), samples.end(), enrollment(inner));
+    };
+    processor.process(samples.begin(), samples.end(), enrollment(calls));
+    EXPECT_GE(merged, calls.firs[0].flatSize());
+    EXPECT_EQ(inner.text, "start image eyes50 success end ");
+    EXPECT_EQ(calls.text, "start image eyes50 success ") << "the inner one has taken its place";
+}
+
+TEST_F(ProcessorsWithModels, AVerificationEndsWithTheFirstMatch) {
+    const Configuration c = configuration();
+    const Verification::Processor processor(c);
+    const FIR fir = record(c, {person(1)});
+    const std::list<Sample> samples{person(2), Sample(grayPattern(60, 50)), person(1), person(2)};
+    Calls calls;
+    const auto two = std::next(samples.begin(), 2);
+    processor.process(two, samples.end(), fir, 0, verification(calls));
+    EXPECT_EQ(calls.text, "start image eyes50 score match end ");
+    processor.process(samples.begin(), two, fir, 0, verification(calls));
+    ASSERT_EQ(calls.scores.size(), 2u);
+    ASSERT_GT(calls.scores[0], calls.scores[1]);
+    const float threshold = (calls.scores[0] + calls.scores[1]) / 2;
+    calls.text.clear();
+    processor.process(samples.begin(), samples.end(), fir, threshold, verification(calls));
+    EXPECT_EQ(calls.text, "start image eyes50 score image blind image eyes50 score match end ");
+    calls.text.clear();
+    processor.process(samples.begin(), two, fir, threshold, verification(calls));
+    EXPECT_EQ(calls.text, "start image eyes50 score image blind noMatch end ");
+}
+
+TEST_F(ProcessorsWithModels, AnIdentificationSeesThePopulationOfTheMoment) {
+    const Configuration c = configuration();
+    Population people(c);
+    const Identification::Processor processor(c, people);
+    const std::list<Sample> samples{Sample(grayPattern(60, 50)), person(1), person(2)};
+    Calls calls;
+    const auto identify = [&](float threshold, unsigned int maxMatches) {
+        calls.text.clear();
+        processor.process(samples.begin(), samples.end(), threshold, identification(calls), maxMatches);
+        return calls.text;
+    };
+    EXPECT_EQ(identify(0, 5), "start image blind image eyes50 image eyes50 matches: end ");
+    people.append(record(c, {person(2)}), "b");
+    people.append(record(c, {person(1)}), "a");
+    EXPECT_EQ(identify(0, 5), "start image blind image eyes50 matches:ab end ");
+    ASSERT_EQ(calls.scores.size(), 2u);
+    EXPECT_EQ(identify(calls.scores[1], 5), "start image blind image eyes50 matches:a end ");
+    EXPECT_EQ(identify(0, 1), "start image blind image eyes50 matches:a end ");
+    EXPECT_EQ(identify(0, 0), "start image blind image eyes50 image eyes50 matches: end ");
+}
+
+TEST_F(ProcessorsWithModels, DevicesDeliverTheImagesThatAreTold) {
+    const Configuration c = configuration("ORBEK.StreamEnroller.TotalEnrollmentTime = 30\n"
+                                          "ORBEK.StreamEnroller.MinImageTime = 0\n"
+                                          "ORBEK.StreamVerifier.MaxNumOfImages = 3\n"
+                                          "ORBEK.StreamVerifier.ImagePeriod = 1\n"
+                                          "ORBEK.StreamIdentifier.TotalTime = 20\n");
+    std::vector<Image> delivered;
+    const CaptureDevice camera(new EmptyRoom(delivered));
+    const auto expect = [&](const Calls& calls, const std::string& outcome) {
+        std::string expected = "start ";
+        for (std::size_t i = 0; i < calls.images.size(); ++i) expected += "image blind ";
+        EXPECT_EQ(calls.text, expected + outcome + " end ");
+        ASSERT_LE(calls.images.size(), delivered.size());
+        EXPECT_TRUE(std::equal(calls.images.begin(), calls.images.end(), delivered.begin()));
+        EXPECT_FALSE(delivered.empty());
+        delivered.clear();
+    };
+    Calls enrolled, verified, identified;
+    Enrollment::Processor(c).process(camera, enrollment(enrolled));
+    expect(enrolled, "failure");
+    Verification::Processor(c).process(camera, FIRBuilder(c).buildVoidFIR(), 0.5f, verification(verified));
+    EXPECT_EQ(verified.images.size(), 3u);
+    expect(verified, "noMatch");
+    Identification::Processor(c, Population(c)).process(camera, 0.5f, identification(identified), 3);
+    expect(identified, "matches:");
+    EXPECT_EQ(thrownBy([&] { Enrollment::Processor(c).process(CaptureDevice(), enrollment(enrolled)); }),
+              "FNEBadArg: Processor: the capture device is a null handle");
+}
+
+/// A camera that is not there.
+class NoCamera final : public CaptureDeviceBody {
+public:
+    Image capture() override { throw std::range_error("no camera"); }
+};
+
+TEST_F(ProcessorsWithModels, ADeviceThatFailsSaysWhy) {
+    const Configuration c = configuration();
+    const CaptureDevice device(new NoCamera);
+    Calls calls;
+    const std::string reason = "std::exception: no camera";
+    EXPECT_EQ(thrownBy([&] { Enrollment::Processor(c).process(device, enrollment(calls)); }), reason);
+    EXPECT_EQ(thrownBy([&] {
+                  const FIR fir = FIRBuilder(c).buildVoidFIR();
+                  Verification::Processor(c).process(device, fir, 0.5f, verification(calls));
+              }),
+              reason);
+    EXPECT_EQ(thrownBy([&] {
+                  Identification::Processor(c, Population(c)).process(device, 0.5f, identification(calls), 3);
+              }),
+              reason);
+    EXPECT_EQ(calls.text, "start start start ");
+}
+
+class ProcessorsOnPhotos : public ProcessorsWithModels {};
+
+TEST_F(ProcessorsOnPhotos, APhotoIsEnrolledAndRecognized) {
+    const std::filesystem::path photo = labelledPhotos() / "scenes/faces/celeba_001719.jpg";
+    if (!std::filesystem::exists(photo)) GTEST_SKIP() << "no labelled photos";
+    const Configuration c = configuration();
+    const std::list<Sample> samples{Sample(ImageIO::load(photo.string()))};
+    const FIR fir = record(c, samples);
+    Calls calls;
+    Verification::Processor(c).process(samples.begin(), samples.end(), fir, 0, verification(calls));
+    ASSERT_EQ(calls.text.substr(0, 16), "start image eyes");
+    EXPECT_NEAR(std::stoi(calls.text.substr(16)), 172, 5) << "the eye where the label has it";
+    EXPECT_TRUE(calls.text.ends_with("score match end "));
+    Calls other;
+    const std::list<Sample> somebody{person(1)};
+    Verification::Processor(c).process(somebody.begin(), somebody.end(), fir, 0, verification(other));
+    EXPECT_GT(calls.scores.at(0), other.scores.at(0));
+}
+
+} // namespace
+} // namespace Orbek
