@@ -21,6 +21,8 @@ namespace {
 using Labelled::Split;
 
 constexpr const char* peopleFolders[] = {"people/lfw", "people/celeba"};
+/// The same few people in light from all sides.
+constexpr const char* lightFolder = "portraits/light";
 constexpr const char* unnamedFolders[] = {"portraits/fairface", "portraits/utkface", "portraits/mtfl"};
 
 /// Standard deviation of the jitter of each coordinate of a landmark, eye distances: about what separates
@@ -106,6 +108,7 @@ std::vector<Source> sourcesBelow(const std::filesystem::path& data) {
     };
     for (const char* folder : peopleFolders) add(folder, true);
     for (const char* folder : unnamedFolders) add(folder, false);
+    add(lightFolder, true);
     return sources;
 }
 

@@ -150,9 +150,9 @@ Fn::InvertibleFunction<float, float> Calibration::tabulate() const {
     double anchor = middle, first = 0, last = 1;
     const auto scoreOf = [&](double raw) { return logistic(logRatio(raw) - anchor); };
     for (int i = 0; i < 20; ++i) {
+        anchor = middle - scoreSlope * std::log((first + last) / (2 - first - last));
         first = scoreOf(low);
         last = scoreOf(high);
-        anchor = middle - scoreSlope * std::log((first + last) / (2 - first - last));
     }
     std::vector<float> values(samples);
     for (int i = 0; i < samples; ++i) {
