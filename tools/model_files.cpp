@@ -1,5 +1,9 @@
 #include "model_files.h"
 
+#include "cmp/b7/encoder.h"
+#include "cmp/b7/preprocessor.h"
+#include "cmp/b7/transformation.h"
+#include "cmp/mapping_files.h"
 #include "cmp/portrait/sphar_transformator.h"
 #include "eye/discriminator/cascaded_svm_discriminator.h"
 #include "eye/discriminator/svm_fp_discriminator.h"
@@ -40,6 +44,15 @@ void openLighting(const std::string& directory, const std::string& name) {
     }
 }
 
+void openB7(const std::string& directory, const std::string& name) {
+    Cmp::B7::Transformation::read(directory + "/" + name, Cmp::B7::PreProcessor::computeFeatureVectorSize(),
+                                  Cmp::B7::Encoder().components());
+}
+
+void openMapping(const std::string& directory, const std::string& name) {
+    Cmp::Implementation::readMappingFile(directory + "/" + name, "orbek-models");
+}
+
 constexpr ModelFile table[] = {
     {"cara", "is1717da.dat", "CascadedSvmDiscriminator, dot product of pixel signs", openCascade<Dot>},
     {"cara", "is1717dl.dat", "CascadedSvmDiscriminator, dot product of pixel signs", openCascade<Dot>},
@@ -56,19 +69,19 @@ constexpr ModelFile table[] = {
     {"boca", "mouthdisc.dat", "CascadedSvmDiscriminator, polynomial of Gabor signs", openCascade<MouthSods>},
     {"raiz", "bridgedisc.dat", "CascadedSvmDiscriminator, polynomial of Gabor signs",
      openCascade<BridgeSods>},
-    {"cmp", "trans-b7.dat", "Cmp::B7::CmpAlgorithm", nullptr},
+    {"cmp", "trans-b7.dat", "Cmp::B7::CmpAlgorithm", openB7},
     {"cmp", "trans-b6.dat", "Cmp::B6::CmpAlgorithm", nullptr},
     {"cmp", "trans-a14.dat", "Cmp::A14::CmpAlgorithm", nullptr},
     {"cmp", "trans-l5x.dat", "Cmp::Pcld::CmpAlgorithm", nullptr},
     {"cmp", "trans-l5z.dat", "Cmp::Pcld::CmpAlgorithm", nullptr},
     {"cmp", "isotdb-l5x.dat", "Cmp::Pcld::CmpAlgorithm", nullptr},
     {"cmp", "isotdb-l5z.dat", "Cmp::Pcld::CmpAlgorithm", nullptr},
-    {"cmp", "smap-b7.dat", "Cmp::SMap", nullptr},
-    {"cmp", "farmap-b7.dat", "Cmp::RMap", nullptr},
-    {"cmp", "frrmap-b7.dat", "Cmp::RMap", nullptr},
-    {"cmp", "smap-b7-sn.dat", "Cmp::SMap", nullptr},
-    {"cmp", "farmap-b7-sn.dat", "Cmp::RMap", nullptr},
-    {"cmp", "frrmap-b7-sn.dat", "Cmp::RMap", nullptr},
+    {"cmp", "smap-b7.dat", "Cmp::SMap", openMapping},
+    {"cmp", "farmap-b7.dat", "Cmp::RMap", openMapping},
+    {"cmp", "frrmap-b7.dat", "Cmp::RMap", openMapping},
+    {"cmp", "smap-b7-sn.dat", "Cmp::SMap", openMapping},
+    {"cmp", "farmap-b7-sn.dat", "Cmp::RMap", openMapping},
+    {"cmp", "frrmap-b7-sn.dat", "Cmp::RMap", openMapping},
     {"cmp", "smap-b6.dat", "Cmp::SMap", nullptr},
     {"cmp", "farmap-b6.dat", "Cmp::RMap", nullptr},
     {"cmp", "frrmap-b6.dat", "Cmp::RMap", nullptr},
