@@ -7,6 +7,7 @@
 #include <cmath>
 #include <istream>
 #include <ostream>
+#include <span>
 
 namespace Orbek::Models {
 namespace {
@@ -58,7 +59,7 @@ std::vector<float> floats(const std::int8_t* values, std::size_t n) {
     return {values, values + n};
 }
 
-double greatest(const std::vector<float>& values) {
+double greatest(std::span<const float> values) {
     double result = 0;
     for (const float v : values) result = std::max<double>(result, std::abs(v));
     return result;
@@ -86,15 +87,43 @@ bool fits(const B7Factors& f) {
 
 } // namespace
 
-std::size_t B7Factors::blocks() const {
-    return blockOfRow.empty() ? 0 : std::size_t{1} + *std::ranges::max_element(blockOfRow);
-}
-
 std::vector<std::vector<std::uint32_t>> B7Factors::rowsOfBlocks() const {
-    std::vector<std::vector<std::uint32_t>> rows(blocks());
+    std::vector<std::vector<std::uint32_t>> rows(
+        blockOfRow.empty() ? 0 : std::size_t{1} + *std::ranges::max_element(blockOfRow));
     for (std::size_t r = 0; r < blockOfRow.size(); ++r)
         rows[blockOfRow[r]].push_back(static_cast<std::uint32_t>(r));
     return rows;
+}
+
+std::vector<B7Factors::Block> B7Factors::blocks() const {
+    std::vector<Block> result;
+    std::size_t first = 0;
+    const std::int8_t* weights = basis.data();
+    for (std::vector<std::uint32_t>& rows : rowsOfBlocks()) {
+        const auto count = static_cast<std::size_t>(
+            std::ranges::count(blockOfComponent, static_cast<std::uint8_t>(result.size())));
+        Fn::Matrix<float> own(rows.size(), count);
+        std::copy_n(weights, rows.size() * count, own.getExclusive());
+        weights += rows.size() * count;
+        result.push_back({std::move(rows), first, own});
+        first += count;
+    }
+    return result;
+}
+
+Fn::Matrix<float> B7Factors::product(const Block& block, const std::vector<float>& square) const {
+    const std::size_t n = components(), count = block.basis.cols();
+    Fn::Matrix<float> part(count, n);
+    double greatestSum = 0;
+    for (std::size_t c = 0; c < n; ++c) {
+        const float* const column = square.data() + c * n + block.first;
+        std::copy_n(column, count, part.getExclusive() + c * count);
+        double sum = 0;
+        for (std::size_t i = 0; i < count; ++i) sum += std::abs(column[i]);
+        greatestSum = std::max(greatestSum, sum);
+    }
+    demandExact(greatestSum * greatest({block.basis.get(), block.basis.rows() * count}));
+    return block.basis * part;
 }
 
 std::vector<float> B7Factors::squareMatrix() const {
@@ -117,33 +146,13 @@ Cmp::B7::Transformation B7Factors::unpack() const {
     const std::vector<float> square = squareMatrix();
     Fn::Matrix<signed char> matrix(rows(), n);
     signed char* const out = matrix.getExclusive();
-    const auto blockRows = rowsOfBlocks();
-    std::size_t firstComponent = 0, firstWeight = 0;
-    for (std::size_t block = 0; block < blockRows.size(); ++block) {
-        const std::vector<std::uint32_t>& own = blockRows[block];
-        const auto count =
-            static_cast<std::size_t>(std::ranges::count(blockOfComponent, static_cast<std::uint8_t>(block)));
-        const std::vector<float> weights = floats(basis.data() + firstWeight, own.size() * count);
-        std::vector<float> rowsOfSquare(count * n), part(own.size() * n);
-        double greatestSum = 0;
-        for (std::size_t c = 0; c < n; ++c) {
-            double sum = 0;
-            for (std::size_t i = 0; i < count; ++i) {
-                const float v = square[c * n + firstComponent + i];
-                rowsOfSquare[c * count + i] = v;
-                sum += std::abs(v);
-            }
-            greatestSum = std::max(greatestSum, sum);
-        }
-        demandExact(greatestSum * greatest(weights));
-        Blas::gemm(false, false, own.size(), n, count, 1, weights.data(), rowsOfSquare.data(), 0,
-                   part.data());
+    for (const Block& block : blocks()) {
+        const Fn::Matrix<float> part = product(block, square);
+        const float* weight = part.get();
         for (std::size_t c = 0; c < n; ++c)
-            for (std::size_t i = 0; i < own.size(); ++i)
-                out[c * rows() + own[i]] = static_cast<signed char>(
-                    std::clamp(std::lround(part[c * own.size() + i] * weightScale), -mostWeight, mostWeight));
-        firstComponent += count;
-        firstWeight += own.size() * count;
+            for (const std::uint32_t r : block.rows)
+                out[c * rows() + r] = static_cast<signed char>(
+                    std::clamp(std::lround(*weight++ * weightScale), -mostWeight, mostWeight));
     }
     FNVector<float> base(n);
     for (std::size_t c = 0; c < n; ++c) {

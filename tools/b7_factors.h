@@ -31,9 +31,17 @@ struct B7Factors {
 
     std::size_t rows() const { return average.size(); }
     std::size_t components() const { return blockOfComponent.size(); }
-    std::size_t blocks() const;
     /// The raw components of each block.
     std::vector<std::vector<std::uint32_t>> rowsOfBlocks() const;
+    struct Block {
+        std::vector<std::uint32_t> rows; ///< its raw components
+        std::size_t first;               ///< of its inner components
+        Fn::Matrix<float> basis;         ///< a row for each raw component, a column for each inner one
+    };
+    std::vector<Block> blocks() const;
+    /// The weights of one block on all features before they are scaled: a row for each of its raw components.
+    /// @param square of squareMatrix(). @throws FNEBadFormat if a sum may be inexact
+    Fn::Matrix<float> product(const Block& block, const std::vector<float>& square) const;
 
     /// The square matrix in integers, column after column. @throws FNEBadFormat if a sum may be inexact
     std::vector<float> squareMatrix() const;

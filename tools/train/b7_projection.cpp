@@ -152,32 +152,25 @@ double learnBasis(const RawVectors& raw, const std::vector<std::size_t>& samples
 /// Inner components of samples, one column for each.
 Matrix<float> innerComponents(const RawVectors& raw, const std::vector<std::size_t>& samples,
                               const B7Factors& factors, double scale) {
-    const auto rows = factors.rowsOfBlocks();
-    std::vector<Matrix<float>> bases;
-    std::size_t weight = 0;
-    for (std::size_t block = 0; block < rows.size(); ++block) {
-        const auto count = static_cast<std::size_t>(
-            std::ranges::count(factors.blockOfComponent, static_cast<std::uint8_t>(block)));
-        Matrix<float> basis(rows[block].size(), count);
-        for (std::size_t i = 0; i < rows[block].size() * count; ++i)
-            basis.getExclusive()[i] = static_cast<float>(factors.basis[weight++] / scale);
-        bases.push_back(basis);
+    std::vector<B7Factors::Block> blocks = factors.blocks();
+    for (B7Factors::Block& block : blocks) {
+        float* const weights = block.basis.getExclusive();
+        for (std::size_t i = 0; i < block.rows.size() * block.basis.cols(); ++i)
+            weights[i] = static_cast<float>(weights[i] / scale);
     }
     Matrix<float> result(factors.components(), samples.size());
     for (std::size_t begin = 0; begin < samples.size(); begin += batch) {
         const std::size_t count = std::min(batch, samples.size() - begin);
-        std::size_t first = 0;
-        for (std::size_t block = 0; block < rows.size(); ++block) {
-            Matrix<float> part(rows[block].size(), count);
+        for (const B7Factors::Block& block : blocks) {
+            Matrix<float> part(block.rows.size(), count);
             float* out = part.getExclusive();
             for (std::size_t s = begin; s < begin + count; ++s)
-                for (const std::uint32_t r : rows[block])
+                for (const std::uint32_t r : block.rows)
                     *out++ = valueOf(raw.vector(samples[s])[r]) - factors.average[r];
-            const Matrix<float> inner = bases[block].transposedMultWith(part);
+            const Matrix<float> inner = block.basis.transposedMultWith(part);
             for (std::size_t s = 0; s < count; ++s)
                 std::copy_n(inner.get() + s * inner.rows(), inner.rows(),
-                            result.getExclusive() + (begin + s) * result.rows() + first);
-            first += inner.rows();
+                            result.getExclusive() + (begin + s) * result.rows() + block.first);
         }
     }
     return result;
@@ -365,6 +358,38 @@ void compress(const Matrix<float>& square, const std::vector<float>& variances, 
     factors.unit = static_cast<float>(1 / (scale * factors.squareScale)); // of the square matrix, so far
 }
 
+/// Orders components by variance, from features of some pictures as they will be.
+/// @param integers square matrix in the present order @return what features are to be scaled by
+double orderAndScale(const RawVectors& raw, const std::vector<std::size_t>& named, const Matrix<float>& inner,
+                     const std::vector<float>& integers, B7Factors& factors) {
+    const std::size_t components = factors.components();
+    Matrix<float> square(components, components);
+    for (std::size_t i = 0; i < integers.size(); ++i) square.getExclusive()[i] = integers[i] * factors.unit;
+    std::mt19937 random(1);
+    Matrix<float> some(components, batch);
+    std::vector<std::string> persons;
+    for (std::size_t k = 0; k < batch; ++k) {
+        const std::size_t c = random() % inner.cols();
+        std::copy_n(inner.get() + c * components, components, some.getExclusive() + k * components);
+        persons.push_back(raw.item(named[c]).person);
+    }
+    const Matrix<float> features = square.transposedMultWith(some);
+    std::vector<float> spread(components);
+    for (std::size_t k = 0; k < batch; ++k)
+        for (std::size_t i = 0; i < components; ++i)
+            spread[i] += features.get()[k * components + i] * features.get()[k * components + i];
+    std::ranges::stable_sort(factors.order, std::ranges::greater(), [&](auto i) { return spread[i]; });
+    const Matrix<float> scores = features.transposedMultWith(features);
+    double squares = 0, pairs = 0;
+    for (std::size_t a = 0; a < batch; ++a)
+        for (std::size_t b = 0; b < a; ++b)
+            if (persons[a] != persons[b]) {
+                squares += scores.get()[a * batch + b] * scores.get()[a * batch + b];
+                ++pairs;
+            }
+    return std::sqrt(impostorDeviation / std::sqrt(squares / pairs));
+}
+
 } // namespace
 
 B7Factors learnProjection(const RawVectors& raw) {
@@ -401,54 +426,17 @@ B7Factors learnProjection(const RawVectors& raw) {
                             static_cast<float>(inner.cols());
     compress(root, variances, factors);
 
-    // Components by variance, and the scale, from features of some pictures as they will be.
     factors.order.resize(components);
     std::iota(factors.order.begin(), factors.order.end(), std::uint16_t{0});
     const std::vector<float> integers = factors.squareMatrix();
-    Matrix<float> square(components, components);
-    for (std::size_t i = 0; i < integers.size(); ++i) square.getExclusive()[i] = integers[i] * factors.unit;
-    std::mt19937 random(1);
-    Matrix<float> some(components, batch);
-    std::vector<std::string> persons;
-    for (std::size_t k = 0; k < batch; ++k) {
-        const std::size_t c = random() % inner.cols();
-        std::copy_n(inner.get() + c * components, components, some.getExclusive() + k * components);
-        persons.push_back(raw.item(named[c]).person);
-    }
-    const Matrix<float> features = square.transposedMultWith(some);
-    std::vector<float> spread(components);
-    for (std::size_t k = 0; k < batch; ++k)
-        for (std::size_t i = 0; i < components; ++i)
-            spread[i] += features.get()[k * components + i] * features.get()[k * components + i];
-    std::ranges::stable_sort(factors.order, std::ranges::greater(), [&](auto i) { return spread[i]; });
-    const Matrix<float> scores = features.transposedMultWith(features);
-    double squares = 0, pairs = 0;
-    for (std::size_t a = 0; a < batch; ++a)
-        for (std::size_t b = 0; b < a; ++b)
-            if (persons[a] != persons[b]) {
-                squares += scores.get()[a * batch + b] * scores.get()[a * batch + b];
-                ++pairs;
-            }
-    const double featureScale = std::sqrt(impostorDeviation / std::sqrt(squares / pairs));
+    const double featureScale = orderAndScale(raw, named, inner, integers, factors);
 
     // The largest weight of the projection becomes the largest that 8 bits hold.
     double most = 0;
-    {
-        const auto rows = factors.rowsOfBlocks();
-        std::size_t first = 0, weight = 0;
-        for (std::size_t block = 0; block < rows.size(); ++block) {
-            const auto count = static_cast<std::size_t>(
-                std::ranges::count(factors.blockOfComponent, static_cast<std::uint8_t>(block)));
-            Matrix<float> basis(rows[block].size(), count), part(count, components);
-            for (std::size_t i = 0; i < rows[block].size() * count; ++i)
-                basis.getExclusive()[i] = factors.basis[weight++];
-            for (std::size_t c = 0; c < components; ++c)
-                std::copy_n(integers.data() + c * components + first, count, part.getExclusive() + c * count);
-            const Matrix<float> product = basis * part;
-            for (std::size_t i = 0; i < rows[block].size() * components; ++i)
-                most = std::max<double>(most, std::abs(product.get()[i]));
-            first += count;
-        }
+    for (const B7Factors::Block& block : factors.blocks()) {
+        const Matrix<float> product = factors.product(block, integers);
+        for (std::size_t i = 0; i < product.rows() * product.cols(); ++i)
+            most = std::max<double>(most, std::abs(product.get()[i]));
     }
     factors.weightScale = mostLevel / most;
     factors.unit = static_cast<float>(factors.unit * featureScale / (basisScale * factors.weightScale));

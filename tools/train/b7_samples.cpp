@@ -4,6 +4,7 @@
 #include "cmp/b7/reshape_warp.h"
 #include "fn/image_reference.h"
 #include "fn/imagefile/image_file.h"
+#include "img/affine/turns.h"
 #include "labelled/finder_access.h"
 #include "labelled/pictures.h"
 
@@ -68,14 +69,6 @@ private:
     BridgeFinder bridge_;
     Cmp::B7::PreProcessor processor_;
 };
-
-FNImage<float> mirroredImage(const FNImage<float>& image) {
-    FNImage<float> result(image.w(), image.h());
-    float* out = result.getExclusive();
-    for (std::uint32_t y = 0; y < image.h(); ++y, out += image.w())
-        std::reverse_copy(image.row(y), image.row(y) + image.w(), out);
-    return result;
-}
 
 Landmarks mirroredLandmarks(const Landmarks& l, float width) {
     const auto mirror = [&](FNPos p) { return FNPos{width - p.x, p.y}; };
@@ -163,8 +156,9 @@ Extracted extract(const Extraction& extraction, const Source& source, std::uint6
     };
     both(image, place, RawVectors::asFound, RawVectors::jittered);
     if (source.named && source.split == Split::train)
-        both(mirroredImage(image), mirroredLandmarks(place, static_cast<float>(image.w())),
-             RawVectors::mirrored, RawVectors::mirrorJittered);
+        both(Img::Affine::vertReflection(image, image.box()),
+             mirroredLandmarks(place, static_cast<float>(image.w())), RawVectors::mirrored,
+             RawVectors::mirrorJittered);
     return result;
 }
 

@@ -3,6 +3,7 @@
 #include "eye/cara/window_geometry.h"
 #include "fn/imagefile/image_file.h"
 #include "img/affine/transform.h"
+#include "img/affine/turns.h"
 
 #include <algorithm>
 #include <cmath>
@@ -16,14 +17,6 @@ constexpr float leastEyeDistance = 14;
 
 constexpr const char* faceFolders[] = {"people/lfw",        "people/celeba",  "portraits/fairface",
                                        "portraits/utkface", "portraits/mtfl", "scenes/faces"};
-
-FNImage<unsigned short> mirrored(const FNImage<unsigned short>& image) {
-    FNImage<unsigned short> result(image.w(), image.h());
-    unsigned short* out = result.getExclusive();
-    for (std::uint32_t y = 0; y < image.h(); ++y, out += image.w())
-        std::reverse_copy(image.row(y), image.row(y) + image.w(), out);
-    return result;
-}
 
 bool nearProfile(const Labelled::Row& row) {
     return std::abs(row.number("pose").value_or(0)) > 1;
@@ -68,7 +61,7 @@ std::vector<Scenery> loadSceneries(const std::filesystem::path& data, Labelled::
     std::vector<Scenery> sceneries;
     for (const FNImage<unsigned short>& image : loadBackgrounds(data, split)) {
         sceneries.push_back({image, {}});
-        sceneries.push_back({mirrored(image), {}});
+        sceneries.push_back({Img::Affine::vertReflection(image, image.box()), {}});
     }
     constexpr std::size_t all = std::numeric_limits<std::size_t>::max();
     for (const Labelled::Row& row : faceRows(data, split, all, random)) {
