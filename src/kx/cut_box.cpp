@@ -44,6 +44,13 @@ void CutBox::checkSize() const {
                                 std::to_string(height) + " pixels is too large");
 }
 
+FNPos boxSide(FNPos direction, int pixels) {
+    const float longest = static_cast<float>(pixels);
+    FNPos side = direction * longest;
+    while (length(side) > longest) side = side * (1 - std::numeric_limits<float>::epsilon() / 2);
+    return side;
+}
+
 void checkPlaces(std::initializer_list<FNPos> places) {
     constexpr float farthest = 1 << 24; // neighbouring pixels are one number from here on
     for (const FNPos place : places)

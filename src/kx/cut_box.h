@@ -27,6 +27,10 @@ private:
 /// A side of a picture, rounded. @throws FNEBadArg if no picture has such a side
 int pictureSide(float pixels);
 
+/// A side of a box that becomes as many pixels of a picture. Rounding never makes it longer: a box larger
+/// than its picture by a hair would be averaged, and lose sharpness.
+FNPos boxSide(FNPos direction, int pixels);
+
 /// @throws FNEBadArg unless all are numbers that can be places in an image
 void checkPlaces(std::initializer_list<FNPos> places);
 

@@ -206,8 +206,8 @@ void Creator::cuttingBox(FNPos left, FNPos right, float lengthRatio, float posit
     box.width = pictureSide(width_ == Width::AspectRatio ? static_cast<float>(box.height) / widthRatio_
                                                          : length(rightEar - leftEar) / widthRatio_);
     const FNPos eyeAxis = allowRotation_ ? (right - left) / length(right - left) : FNPos(1, 0);
-    box.u = eyeAxis * static_cast<float>(box.width);
-    box.v = FNPos(-eyeAxis.y, eyeAxis.x) * static_cast<float>(box.height);
+    box.u = boxSide(eyeAxis, box.width);
+    box.v = boxSide({-eyeAxis.y, eyeAxis.x}, box.height);
     box.origin = (left + right) / 2.0f - 0.5f * box.u - (1 - position) * box.v;
 }
 

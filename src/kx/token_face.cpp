@@ -20,26 +20,24 @@ struct Kind {
     bool blendsBorder;
 };
 
-/// @param u,v the axes of the face, of length 1
-/// @param beside,above from the corner of the box to the left eye
-CutBox boxAround(FNPos left, FNPos u, FNPos v, float beside, float above, float width, float height) {
-    CutBox box;
-    box.origin = left - beside * u - above * v;
-    box.u = width * u;
-    box.v = height * v;
-    return box;
+/// From the left eye to the right one, of length 1.
+FNPos eyeAxis(FNPos left, FNPos right) {
+    return (right - left) / length(right - left);
+}
+FNPos across(FNPos axis) {
+    return {-axis.y, axis.x};
 }
 
 constexpr Kind standard{[](FNPos left, FNPos right) {
                             const float distance = length(right - left);
-                            const FNPos axis = (right - left) / distance;
-                            const int width = pictureSide(4 * distance);
-                            const int height = pictureSide(4 * static_cast<float>(width) / 3);
-                            CutBox box = boxAround(left, axis, {-axis.y, axis.x}, 1.5f * distance,
-                                                   29 * 0.083333336f * distance, static_cast<float>(width),
-                                                   static_cast<float>(height));
-                            box.width = width;
-                            box.height = height;
+                            const FNPos axis = eyeAxis(left, right);
+                            CutBox box;
+                            box.width = pictureSide(4 * distance);
+                            box.height = pictureSide(4 * static_cast<float>(box.width) / 3);
+                            box.origin =
+                                left - 1.5f * distance * axis - 29 * 0.083333336f * distance * across(axis);
+                            box.u = boxSide(axis, box.width);
+                            box.v = boxSide(across(axis), box.height);
                             return box;
                         },
                         [](float width, float height) -> EyePlaces {
@@ -49,12 +47,14 @@ constexpr Kind standard{[](FNPos left, FNPos right) {
                         true};
 
 constexpr Kind minimal{[](FNPos left, FNPos right) {
-                           const float distance = length(right - left), scale = 60 / distance;
-                           const FNPos axis = (right - left) / distance;
-                           CutBox box = boxAround(left, axis, {-axis.y, axis.x}, 90 / scale, 145 / scale,
-                                                  240 / scale, 320 / scale);
+                           const float scale = 60 / length(right - left);
+                           const FNPos axis = eyeAxis(left, right);
+                           CutBox box;
                            box.width = 240;
                            box.height = 320;
+                           box.origin = left - 90 / scale * axis - 145 / scale * across(axis);
+                           box.u = 240 / scale * axis;
+                           box.v = 320 / scale * across(axis);
                            return box;
                        },
                        [](float, float) -> EyePlaces {
