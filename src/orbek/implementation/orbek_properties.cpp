@@ -7,7 +7,9 @@
 #include "eye/tracker/reference_face_tracker.h"
 #include "fg/capture_types.h"
 #include "fn/deployment/composite_values.h"
+#include "kx/feature_test.h"
 #include "kx/full_frontal_creator.h"
+#include "kx/full_frontal_test.h"
 #include "kx/set_enroller.h"
 #include "kx/set_identifier.h"
 #include "kx/set_recognizer.h"
@@ -62,9 +64,9 @@ std::list<Property> members() {
         property<Kx::SetIdentifier>::create("SetIdentifier", "Set Identifier"),
         property<Eye::ReferenceFaceTracker>::create("FaceTracker", "Face Tracker Engine"),
         property<Cmp::Portrait::Analyzer>::create("PortraitAnalyzer", "Portrait Analyzer"),
-        pending("ISOFullFrontalTest", "Kx::ISO_19794_5::FullFrontal::Test",
-                "ISO 19794-5 Full Frontal images assessment"),
-        pending("FeatureTest", "Kx::Feature::Test", "Portrait feature assessment"),
+        property<Kx::ISO_19794_5::FullFrontal::Test>::create("ISOFullFrontalTest",
+                                                             "ISO 19794-5 Full Frontal images assessment"),
+        property<Kx::Feature::Test>::create("FeatureTest", "Portrait feature assessment"),
         property<Kx::FullFrontal::Creator>::create("CropFullFrontal",
                                                    "ISO 19794-5 Full Frontal images cropping"),
         property<Kx::TokenFace::CropTokenImage>::create("CropTokenImage",
