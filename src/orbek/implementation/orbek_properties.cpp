@@ -8,6 +8,7 @@
 #include "fg/capture_types.h"
 #include "fn/deployment/composite_values.h"
 #include "kx/feature_test.h"
+#include "kx/full_frontal_creator.h"
 #include "kx/full_frontal_test.h"
 #include "kx/set_enroller.h"
 #include "kx/set_identifier.h"
@@ -15,6 +16,7 @@
 #include "kx/stream_enroller.h"
 #include "kx/stream_identifier.h"
 #include "kx/stream_recognizer.h"
+#include "kx/token_face.h"
 
 namespace Orbek {
 
@@ -65,8 +67,10 @@ std::list<Property> members() {
         property<Kx::ISO_19794_5::FullFrontal::Test>::create("ISOFullFrontalTest",
                                                              "ISO 19794-5 Full Frontal images assessment"),
         property<Kx::Feature::Test>::create("FeatureTest", "Portrait feature assessment"),
-        pending("CropFullFrontal", "CropToFullFrontal", "ISO 19794-5 Full Frontal images cropping"),
-        pending("CropTokenImage", "CropToTokenImage", "ISO 19794-5 Token images cropping"),
+        property<Kx::FullFrontal::Creator>::create("CropFullFrontal",
+                                                   "ISO 19794-5 Full Frontal images cropping"),
+        property<Kx::TokenFace::CropTokenImage>::create("CropTokenImage",
+                                                        "ISO 19794-5 Token images cropping"),
         property<FG::DllFrameGrabberFactoryCacheDef>::create(
             "FgDllCache", "Definition of DLL load paths for capture devices"),
         property<Container<FG::FrameGrabberFactoryDef>>::create("CaptureDevices",
