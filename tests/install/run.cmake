@@ -76,5 +76,5 @@ run(output ${SCRATCH}/find_faces ${configuration} ${picture})
 check("${output}" "${expected}")
 
 # The program finds its configuration by itself.
-run(output ${sdk}/bin/orbek find ${picture})
+run(output ${sdk}/bin/orbek find --json ${picture})
 check("${output}" "${expected_json}")
