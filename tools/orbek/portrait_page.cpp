@@ -35,7 +35,7 @@ nav a{color:#0b4fa8;overflow-wrap:anywhere}
 .fail{background:var(--badback);color:var(--bad)}
 .unmet{background:var(--noteback);color:var(--note)}
 .none{background:#eceff3;color:var(--soft)}
-.pictures{display:grid;gap:1rem}
+.pictures{display:grid;gap:1rem;position:sticky;top:1rem}
 figure{margin:0}
 figure svg,figure img{display:block;width:100%;height:auto;border-radius:.5rem;background:#ddd}
 figure.token img{max-width:15rem}
@@ -52,10 +52,10 @@ caption{text-align:left;font-weight:600;padding:.25rem 0}
 th,td{text-align:left;vertical-align:top;padding:.45rem .5rem;border-top:1px solid var(--line)}
 th:first-child,td:first-child{padding-left:0}
 thead th{font-size:.8125rem;color:var(--soft);font-weight:600;border-top:0;padding-bottom:.15rem}
-tbody th{width:15rem;font-weight:500}
+tbody th,thead th:first-child{width:16rem;font-weight:500}
 tbody th small{display:block;color:var(--soft);font-weight:400}
 td.outcome,th.outcome{width:6.5rem;text-align:right;padding-right:0}
-.value{display:grid;grid-template-columns:minmax(7.5rem,1fr) 8rem minmax(6rem,1.6fr);gap:.25rem .75rem;align-items:center}
+.value{display:grid;grid-template-columns:minmax(10.5rem,1fr) 7rem minmax(5rem,1.1fr);gap:.25rem .75rem;align-items:center}
 .value+.value{margin-top:.25rem}
 .value b{font-weight:600;font-variant-numeric:tabular-nums}
 .value span.limits{color:var(--soft);font-size:.875rem;font-variant-numeric:tabular-nums}
@@ -63,10 +63,10 @@ td.outcome,th.outcome{width:6.5rem;text-align:right;padding-right:0}
 .scale i{position:absolute;top:0;bottom:0;background:var(--allowed);border-radius:.3rem}
 .scale u{position:absolute;top:-.2rem;bottom:-.2rem;width:.25rem;margin-left:-.125rem;border-radius:.125rem;background:var(--good)}
 .scale u.off{background:#b3261e}
-@media (max-width:60rem){.portrait{grid-template-columns:minmax(0,1fr)}.pictures{grid-template-columns:minmax(0,2fr) minmax(0,1fr)}}
+@media (max-width:60rem){.portrait{grid-template-columns:minmax(0,1fr)}.pictures{position:static;grid-template-columns:minmax(0,2fr) minmax(0,1fr)}}
 @media (max-width:40rem){main{padding:.6rem}nav,section{padding:.8rem;border-radius:.5rem}
 .pictures{grid-template-columns:minmax(0,1fr)}thead{position:absolute;width:1px;height:1px;overflow:hidden;clip-path:inset(50%)}
-table,tbody,tr{display:block}tr{display:grid;grid-template-columns:minmax(0,1fr) auto;gap:.15rem .5rem;padding:.6rem 0;
+table,caption,tbody,tr{display:block}tr{display:grid;grid-template-columns:minmax(0,1fr) auto;gap:.15rem .5rem;padding:.6rem 0;
 border-top:1px solid var(--line)}tbody th,td,td.outcome{display:block;width:auto;padding:0;border:0}
 td.values{grid-row:2;grid-column:1/3}.value{grid-template-columns:minmax(0,1fr) auto}.value .scale{grid-column:1/3}}
 @media print{body{background:#fff}section{break-inside:avoid}}
@@ -132,7 +132,7 @@ std::string scaleOf(const CheckedValue& v) {
         return std::isnan(value) ? 0 : std::clamp((value - v.from) / (v.to - v.from), 0.0, 1.0) * 100;
     };
     const double first = v.least ? place(*v.least) : 0, last = v.greatest ? place(*v.greatest) : 100;
-    constexpr double thinnest = 1.5; // so that a single allowed value is seen
+    constexpr double thinnest = 4; // so that a single allowed value is seen
     return "<div class=\"scale\" aria-hidden=\"true\"><i style=\"left:" +
            number(std::min(first, 100 - thinnest)) + "%;width:" + number(std::max(last - first, thinnest)) +
            "%\"></i><u" + (isAllowed(v) ? "" : " class=\"off\"") + " style=\"left:" + number(place(v.value)) +
