@@ -93,5 +93,5 @@ run(output ${SCRATCH}/search ${searched})
 check("${output}" "${found}")
 
 # The program finds its configuration by itself.
-run(output ${sdk}/bin/orbek find ${picture})
+run(output ${sdk}/bin/orbek find --json ${picture})
 check("${output}" "${expected_json}")

@@ -1,5 +1,7 @@
 #include "record_file.h"
 
+#include "command.h"
+
 #include <cstdint>
 #include <cstring>
 #include <filesystem>
@@ -13,25 +15,15 @@ namespace {
 
 namespace fs = std::filesystem;
 
-/// The flat form of a record begins with it.
-std::uint32_t numberOfFeatures(const FIR& record) {
-    std::vector<unsigned char> flat(record.flatSize());
-    unsigned char* memory = flat.data();
-    record.writeTo(memory);
-    std::uint32_t count = 0;
-    std::memcpy(&count, flat.data(), sizeof count);
-    return count;
-}
-
 } // namespace
 
 FIR readRecord(const FIRBuilder& builder, const std::string& file) {
     std::ifstream stream(file, std::ios::binary);
-    if (!stream || fs::is_directory(file)) throw std::runtime_error(file + ": cannot be opened");
+    if (!stream || fs::is_directory(file)) throw UnreadableInput(file + ": cannot be opened");
     try {
         return builder.build(stream);
     } catch (const std::exception& e) {
-        throw std::runtime_error(file + ": " + e.what());
+        throw UnreadableInput(file + ": " + e.what());
     }
 }
 
@@ -45,6 +37,16 @@ void writeRecord(const FIR& record, const std::string& file) {
     if (stream && !failure) return;
     fs::remove(unfinished, failure);
     throw std::runtime_error(file + ": cannot be written");
+}
+
+std::uint32_t numberOfFeatures(const FIR& record) {
+    // The flat form begins with it.
+    std::vector<unsigned char> flat(record.flatSize());
+    unsigned char* memory = flat.data();
+    record.writeTo(memory);
+    std::uint32_t count = 0;
+    std::memcpy(&count, flat.data(), sizeof count);
+    return count;
 }
 
 nlohmann::ordered_json describeRecord(const FIR& record, const std::string& file) {

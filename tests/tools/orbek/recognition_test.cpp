@@ -28,7 +28,7 @@ protected:
 
     static ProgramRun run(std::vector<std::string> arguments) {
         arguments.insert(arguments.end(), {"--config", folder().file("b7.conf")});
-        return runOrbek(arguments);
+        return runOrbekJson(arguments);
     }
     static std::string image(const std::string& name) { return ORBEK_SOURCE_DIR "/examples/images/" + name; }
     /// A record of one picture.
@@ -109,7 +109,7 @@ TEST_F(RecognitionToolWithModels, ComparesAndMergesRecords) {
     EXPECT_EQ(shown.status, 2);
     EXPECT_EQ(shown.lines().size(), 2u);
     EXPECT_EQ(shown.complaints.rfind("orbek: " + broken + ": ", 0), 0u);
-    EXPECT_EQ(run({"compare", bob, broken}).status, 1);
+    EXPECT_EQ(run({"compare", bob, broken}).status, 2);
     EXPECT_EQ(run({"merge", bob, "/no/such.fir", "-o", both}).complaints,
               "orbek: /no/such.fir: cannot be opened\n");
 }
