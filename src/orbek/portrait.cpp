@@ -156,4 +156,10 @@ Characteristics Analyzer::analyze(const std::pair<Image, Eyes::Location>& imageW
                                                  faces);
 }
 
+Characteristics Analyzer::analyzeColor(const std::pair<Image, Eyes::Location>& imageWithEyes) const {
+    const unsigned int faces = implementation_->countFaces(imageWithEyes.first);
+    return Characteristics::Implementation::make(implementation_->engine().analyzeColor(adapt(imageWithEyes)),
+                                                 faces);
+}
+
 } // namespace Orbek::Portrait

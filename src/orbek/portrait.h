@@ -99,6 +99,8 @@ public:
     /// colour, if the image is.
     /// @throws std::exception if the finder's model files cannot be read
     Characteristics analyze(const std::pair<Image, Eyes::Location>& imageWithEyes) const;
+    /// The same in colour, whatever the image is.
+    Characteristics analyzeColor(const std::pair<Image, Eyes::Location>& imageWithEyes) const;
 
     class [[gnu::visibility("hidden")]] Implementation;
 

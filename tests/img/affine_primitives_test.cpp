@@ -260,6 +260,32 @@ TEST(Bilinear, FixedPointParallelogramsEqualTheirPlainForm) {
     }
 }
 
+TEST(Bilinear, ColorsAreSampledChannelByChannel) {
+    forEachTarget([] {
+        RandomImages random(8);
+        for (int round = 0; round < 60; ++round) {
+            const auto src = random.image<Fn::Bgra32>(random.number(1, 30), random.number(1, 30));
+            const auto vector = [&] { return FN2Vector<float>(random.real(-30, 30), random.real(-30, 30)); };
+            const FNPos origin(random.real(-5, 25), random.real(-5, 25));
+            const FN2Vector<float> u = vector(), v = vector();
+            FNImage<Fn::Bgra32> dst(static_cast<std::uint32_t>(random.number(1, 40)),
+                                    static_cast<std::uint32_t>(random.number(1, 20)));
+            bilinearInterpolationFixedpoint(src, dst, origin, u, v, true, {1, 2, 3});
+            for (const auto channel : {&Fn::Bgra32::b, &Fn::Bgra32::g, &Fn::Bgra32::r}) {
+                Words plane(src.w(), src.h());
+                std::ranges::transform(src.span(), plane.getExclusive(),
+                                       [&](const Fn::Bgra32& pixel) { return pixel.*channel; });
+                const Words expected = Plain::bilinear(plane, dst.w(), dst.h(), origin, u, v, [&] {
+                    return static_cast<unsigned short>(Fn::Bgra32(1, 2, 3).*channel);
+                });
+                for (std::uint64_t i = 0; i < dst.size(); ++i)
+                    ASSERT_EQ(dst.data()[i].*channel, expected.data()[i]) << round << ", pixel " << i;
+            }
+            for (const Fn::Bgra32& pixel : dst.span()) ASSERT_EQ(pixel.a, 255);
+        }
+    });
+}
+
 /// One float sample by the rule for neighbours outside: a value inside along the same row or column, or the
 /// only one.
 float floatSample(const FNImage<float>& src, double x, double y, float background) {

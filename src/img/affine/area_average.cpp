@@ -231,8 +231,10 @@ void averageByDivision(const FNImage<Fn::Bgra32>& src, const AreaGrid& grid, FNI
     for (const Channel channel :
          {Channel(&Fn::Bgra32::b), Channel(&Fn::Bgra32::g), Channel(&Fn::Bgra32::r)}) {
         unsigned short* to = plane.getExclusive();
-        for (FNConstImIter<Fn::Bgra32> it(src, grid.box); !it.atEnd(); ++it)
-            *to++ = static_cast<unsigned short>((*it).*channel << 8 | 128);
+        for (FNConstImIter<Fn::Bgra32> it(src, grid.box); !it.atEnd(); it.nextRow())
+            to = std::ranges::transform(it.restOfRow(), to, [channel](const Fn::Bgra32& pixel) {
+                     return static_cast<unsigned short>(pixel.*channel << 8 | 128);
+                 }).out;
         averageByDivision(plane, planeGrid, result);
         for (std::uint64_t i = 0; i < result.size(); ++i)
             out[i].*channel = static_cast<unsigned char>(result.data()[i] >> 8);
