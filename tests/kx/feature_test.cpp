@@ -1,7 +1,7 @@
 #include "kx/feature_test.h"
 
 #include "cmp/measured_portrait.h"
-#include "kx/settings.h"
+#include "support/settings.h"
 #include "support/thrown.h"
 
 #include <gtest/gtest.h>

@@ -2,7 +2,7 @@
 
 #include "cmp/measured_portrait.h"
 #include "cmp/portrait/analyzer.h"
-#include "kx/settings.h"
+#include "support/settings.h"
 #include "support/thrown.h"
 
 #include <gtest/gtest.h>

@@ -46,10 +46,19 @@ public:
                 compliance,
                 limits,
                 portraitChecks(portrait, compliance, limits),
-                cutToken ? tokens_.extract({image, eyes}).first : Image()};
+                cutToken ? tokenOf({image, eyes}) : Image()};
     }
 
 private:
+    /// Null if the settings do not allow it, for instance because of what would have to be filled.
+    Image tokenOf(const std::pair<Image, Eyes::Location>& found) const {
+        try {
+            return tokens_.extract(found).first;
+        } catch (const std::exception&) {
+            return Image();
+        }
+    }
+
     ProminentEyes eyes_;
     Portrait::Analyzer analyzer_;
     Portrait::Feature::Test features_;
