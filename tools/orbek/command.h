@@ -32,6 +32,7 @@ struct Command {
 
 /// Each adds one command to the program, or a group of them, and lives in a file of its own.
 Command compareCommand(CLI::App& program);
+Command demoCommand(CLI::App& program);
 Command enrolCommand(CLI::App& program);
 Command findCommand(CLI::App& program);
 Command identifyCommand(CLI::App& program);

@@ -16,7 +16,8 @@ int main(int argc, char** argv) {
     program.require_subcommand(1);
     std::vector<Command> commands = {enrolCommand(program), verifyCommand(program), identifyCommand(program),
                                      showCommand(program),  mergeCommand(program),  compareCommand(program),
-                                     findCommand(program),  trackCommand(program),  portraitCommand(program)};
+                                     findCommand(program),  trackCommand(program),  portraitCommand(program),
+                                     demoCommand(program)};
     for (const auto& group : {galleryCommands, recordCommands})
         std::ranges::copy(group(program), std::back_inserter(commands));
     const auto parsed = [&] {
