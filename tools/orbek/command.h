@@ -39,6 +39,7 @@ Command mergeCommand(CLI::App& program);
 Command showCommand(CLI::App& program);
 Command trackCommand(CLI::App& program);
 Command verifyCommand(CLI::App& program);
+std::vector<Command> cropCommands(CLI::App& program);
 std::vector<Command> galleryCommands(CLI::App& program);
 
 } // namespace Orbek::Tool

@@ -17,7 +17,7 @@ int main(int argc, char** argv) {
     std::vector<Command> commands = {enrolCommand(program), verifyCommand(program), identifyCommand(program),
                                      showCommand(program),  mergeCommand(program),  compareCommand(program),
                                      findCommand(program),  trackCommand(program)};
-    for (const auto& group : {galleryCommands})
+    for (const auto& group : {galleryCommands, cropCommands})
         std::ranges::copy(group(program), std::back_inserter(commands));
     const auto parsed = [&] {
         return std::ranges::find_if(commands, [](const Command& command) { return command.app->parsed(); });
