@@ -16,8 +16,8 @@ int main(int argc, char** argv) {
     program.require_subcommand(1);
     std::vector<Command> commands = {enrolCommand(program), verifyCommand(program), identifyCommand(program),
                                      showCommand(program),  mergeCommand(program),  compareCommand(program),
-                                     findCommand(program),  trackCommand(program)};
-    for (const auto& group : {galleryCommands, cropCommands})
+                                     findCommand(program),  trackCommand(program),  portraitCommand(program)};
+    for (const auto& group : {galleryCommands, recordCommands, cropCommands})
         std::ranges::copy(group(program), std::back_inserter(commands));
     const auto parsed = [&] {
         return std::ranges::find_if(commands, [](const Command& command) { return command.app->parsed(); });

@@ -1,11 +1,13 @@
 #include "record_file.h"
 
 #include "command.h"
+#include "whole_file.h"
 
 #include <cstdint>
 #include <cstring>
 #include <filesystem>
 #include <fstream>
+#include <sstream>
 #include <vector>
 
 #include <nlohmann/json.hpp>
@@ -28,15 +30,9 @@ FIR readRecord(const FIRBuilder& builder, const std::string& file) {
 }
 
 void writeRecord(const FIR& record, const std::string& file) {
-    const std::string unfinished = file + ".part";
-    std::ofstream stream(unfinished, std::ios::binary);
-    stream << record;
-    stream.close();
-    std::error_code failure;
-    if (stream) fs::rename(unfinished, file, failure);
-    if (stream && !failure) return;
-    fs::remove(unfinished, failure);
-    throw std::runtime_error(file + ": cannot be written");
+    std::ostringstream bytes;
+    bytes << record;
+    writeWhole(file, bytes.str());
 }
 
 std::uint32_t numberOfFeatures(const FIR& record) {

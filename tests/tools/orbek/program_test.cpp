@@ -121,7 +121,7 @@ TEST(OrbekToolOnPhotos, TrackGivesAFaceOneIdThroughTheFrames) {
         scratch.write("c.conf", "ORBEK.Substitutions.INSTALLDIR = " ORBEK_BINARY_DIR "\n"
                                 "ORBEK.FaceTracker.ReturnFacesWithNoEyesThreshold = -10\n");
     const ProgramRun run = runOrbekJson({"track", scratch.path().string(), "--config", config, "--fps", "8",
-                                     "--draw", scratch.file("drawn")});
+                                         "--draw", scratch.file("drawn")});
     ASSERT_EQ(run.status, 0) << run.complaints;
     const auto lines = run.lines();
     ASSERT_EQ(lines.size(), 3u);
