@@ -42,6 +42,7 @@ Command showCommand(CLI::App& program);
 Command trackCommand(CLI::App& program);
 Command verifyCommand(CLI::App& program);
 std::vector<Command> configCommands(CLI::App& program);
+std::vector<Command> cropCommands(CLI::App& program);
 std::vector<Command> galleryCommands(CLI::App& program);
 std::vector<Command> modelsCommands(CLI::App& program);
 std::vector<Command> recordCommands(CLI::App& program);

@@ -18,7 +18,7 @@ int main(int argc, char** argv) {
         enrolCommand(program),    verifyCommand(program),  identifyCommand(program), showCommand(program),
         mergeCommand(program),    compareCommand(program), findCommand(program),     trackCommand(program),
         portraitCommand(program), manPagesCommand(program)};
-    for (const auto& group : {galleryCommands, recordCommands, configCommands, modelsCommands})
+    for (const auto& group : {galleryCommands, recordCommands, cropCommands, configCommands, modelsCommands})
         std::ranges::copy(group(program), std::back_inserter(commands));
     const auto parsed = [&] {
         return std::ranges::find_if(commands, [](const Command& command) { return command.app->parsed(); });
