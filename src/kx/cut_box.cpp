@@ -4,6 +4,8 @@
 #include "fn/imagefile/image_limits.h"
 #include "fn/shape.h"
 
+#include <sstream>
+
 namespace Kx {
 
 using namespace Fn::Deployment;
@@ -32,9 +34,11 @@ unsigned char channelOf(const Component& component, const char* key) {
 
 int pictureSide(float pixels) {
     const float side = std::trunc(pixels + 0.5f);
-    if (!(side >= 1 && side <= static_cast<float>(Fn::ImageLimits().maxWidth)))
-        FN_THROW(FNEBadArg, "Failed to cut out a face: a side of the picture would have " +
-                                std::to_string(side) + " pixels");
+    if (!(side >= 1 && side <= static_cast<float>(Fn::ImageLimits().maxWidth))) {
+        std::ostringstream text;
+        text << "Failed to cut out a face: a side of the picture would have " << side << " pixels";
+        FN_THROW(FNEBadArg, text.str());
+    }
     return static_cast<int>(side);
 }
 

@@ -68,7 +68,7 @@ endfunction()
 
 # Examples by find_package...
 set(ENV{LD_LIBRARY_PATH} ${lib})
-foreach(example find_faces search_in_c)
+foreach(example find_faces people search_in_c)
     run(log ${CMAKE_COMMAND} -S ${SOURCE}/examples/${example} -B ${SCRATCH}/${example} -DCMAKE_PREFIX_PATH=${sdk}
         -DCMAKE_CXX_COMPILER=${COMPILER} -DCMAKE_C_COMPILER=${C_COMPILER})
     run(log ${CMAKE_COMMAND} --build ${SCRATCH}/${example})
@@ -80,6 +80,18 @@ set(searched ${configuration} ${people}/alice1.jpg ${people}/bob1.jpg ${people}/
 set(found "1 of them may be the person of [^\n]*alice1.jpg\n[^\n]*alice2.jpg is found: ")
 run(output ${SCRATCH}/search_in_c/search_in_c ${searched})
 check("${output}" "${found}")
+foreach(person alice bob)
+    run(output ${SCRATCH}/people/enrol_people ${configuration} ${SCRATCH}/${person}.fir
+        ${people}/${person}1.jpg ${people}/${person}2.jpg)
+    check("${output}" "written to [^\n]*${person}.fir\n")
+endforeach()
+run(output ${SCRATCH}/people/verify_people ${configuration} ${SCRATCH}/bob.fir ${people}/bob3.jpg)
+check("${output}" "\nthe same person\n")
+run(output ${SCRATCH}/people/verify_people ${configuration} ${SCRATCH}/bob.fir ${people}/alice3.jpg)
+check("${output}" "\nnot the same person\n")
+run(output ${SCRATCH}/people/identify_people ${configuration} ${people}/alice4.jpg ${SCRATCH}/bob.fir
+    ${SCRATCH}/alice.fir)
+check("${output}" "^1 matches\n[^\n]*alice.fir: ")
 
 # ...and by pkg-config.
 set(ENV{PKG_CONFIG_PATH} ${lib}/pkgconfig)

@@ -36,12 +36,16 @@ Command demoCommand(CLI::App& program);
 Command enrolCommand(CLI::App& program);
 Command findCommand(CLI::App& program);
 Command identifyCommand(CLI::App& program);
+Command manPagesCommand(CLI::App& program);
 Command mergeCommand(CLI::App& program);
 Command portraitCommand(CLI::App& program);
 Command showCommand(CLI::App& program);
 Command trackCommand(CLI::App& program);
 Command verifyCommand(CLI::App& program);
+std::vector<Command> configCommands(CLI::App& program);
+std::vector<Command> cropCommands(CLI::App& program);
 std::vector<Command> galleryCommands(CLI::App& program);
+std::vector<Command> modelsCommands(CLI::App& program);
 std::vector<Command> recordCommands(CLI::App& program);
 
 } // namespace Orbek::Tool

@@ -290,6 +290,7 @@ Population GalleryFile::load(const Configuration& configuration, unsigned int jo
                                    ->number(1, static_cast<std::int64_t>(begin))
                                    .number(2, static_cast<std::int64_t>(end));
         std::vector<std::pair<std::string, FIR>> entries;
+        entries.reserve(std::min(portion, smallestPortion)); // ids need not be dense
         while (selection.step()) entries.emplace_back(selection.bytes(0), selection.record(builder));
         const std::lock_guard lock(mutex);
         for (const auto& [id, record] : entries) population.append(record, id);

@@ -14,11 +14,11 @@ int main(int argc, char** argv) {
         "Exit status: 0 done, 1 failed, 2 an input could not be read (the others are done).",
         "orbek");
     program.require_subcommand(1);
-    std::vector<Command> commands = {enrolCommand(program), verifyCommand(program), identifyCommand(program),
-                                     showCommand(program),  mergeCommand(program),  compareCommand(program),
-                                     findCommand(program),  trackCommand(program),  portraitCommand(program),
-                                     demoCommand(program)};
-    for (const auto& group : {galleryCommands, recordCommands})
+    std::vector<Command> commands = {enrolCommand(program), verifyCommand(program),  identifyCommand(program),
+                                     showCommand(program),  mergeCommand(program),   compareCommand(program),
+                                     findCommand(program),  trackCommand(program),   portraitCommand(program),
+                                     demoCommand(program),  manPagesCommand(program)};
+    for (const auto& group : {galleryCommands, recordCommands, cropCommands, configCommands, modelsCommands})
         std::ranges::copy(group(program), std::back_inserter(commands));
     const auto parsed = [&] {
         return std::ranges::find_if(commands, [](const Command& command) { return command.app->parsed(); });

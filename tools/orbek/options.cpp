@@ -30,6 +30,7 @@ void addImages(CLI::App& command, std::vector<std::string>& images, const std::s
 void addJobs(CLI::App& command, unsigned int& jobs) {
     jobs = std::clamp(std::thread::hardware_concurrency(), 1u, 1024u);
     command.add_option("--jobs", jobs, "Threads that share the work; one for each processor otherwise")
+        ->type_name("N")
         ->check(CLI::Range(1u, 1024u));
 }
 

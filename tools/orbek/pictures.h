@@ -82,6 +82,9 @@ public:
     /// Writes the picture that was drawn for a source. @throws std::runtime_error naming the file
     void write(std::size_t source, const FNImageReference& picture) const;
 
+    /// The names for all sources.
+    const std::vector<std::filesystem::path>& files() const { return names_; }
+
 private:
     std::vector<std::filesystem::path> names_;
 };

@@ -50,7 +50,7 @@ int write(const WriteOptions& options) {
             if (options.uncut)
                 faces.emplace_back(image, Eyes::Location());
             else if (!found)
-                throw std::runtime_error("no eyes found");
+                throw std::runtime_error("there are no eyes of a face");
             else
                 faces.push_back(options.minimal ? creator.extractMinimal({image, *found})
                                                 : creator.extract({image, *found}));

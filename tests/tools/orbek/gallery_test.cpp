@@ -109,6 +109,7 @@ TEST_F(GalleryToolWithModels, HasAllThatAKilledImportTold) {
     const std::string gallery = emptyGallery(scratch);
     const Ids people = makeTree(scratch, "tree");
     for (const std::size_t told : {1u, 2u, 5u}) {
+        (void)std::fflush(stdout);
         const pid_t child = fork();
         if (child == 0) {
             (void)!freopen(scratch.file("told").c_str(), "w", stdout);
@@ -118,7 +119,7 @@ TEST_F(GalleryToolWithModels, HasAllThatAKilledImportTold) {
             _exit(127);
         }
         const auto lines = [&] { return std::ranges::count(scratch.read("told"), '\n'); };
-        while (waitpid(child, nullptr, WNOHANG) == 0)
+        for (; waitpid(child, nullptr, WNOHANG) == 0; usleep(1000))
             if (static_cast<std::size_t>(lines()) >= told) kill(child, SIGKILL);
         const std::string text = scratch.read("told");
         const Ids before = idsOf({0, text.substr(0, text.rfind('\n') + 1), ""}), there = ids(gallery);

@@ -79,7 +79,7 @@ TEST(RecordToolWithModels, WritesPicturesAndReadsThemBack) {
     const ProgramRun written = runOrbek(
         {"record", "write", "--json", "--minimal", "-o", file, picture("bob1"), none, picture("alice1")});
     EXPECT_EQ(written.status, 2);
-    EXPECT_EQ(written.complaints, "orbek: " + none + ": no eyes found\n");
+    EXPECT_EQ(written.complaints, "orbek: " + none + ": there are no eyes of a face\n");
     ASSERT_EQ(written.lines().size(), 3u);
     EXPECT_EQ(written.lines()[0]["height"], 320);
     EXPECT_EQ(written.lines()[2]["bytes"], scratch.read("faces.rec").size());

@@ -1,3 +1,4 @@
+#include "fn/imagefile/image_file.h"
 #include "recognition_tool.h"
 
 #include <gtest/gtest.h>
@@ -17,6 +18,15 @@ TEST_F(RecognitionToolWithModels, EnrolsPicturesToOneRecord) {
     EXPECT_EQ(lines[2]["file"], file);
     EXPECT_EQ(lines[2]["bytes"], scratch.read("bob.fir").size());
     EXPECT_EQ(run({"show", file}).lines().at(0), lines[2]);
+
+    // Gray pictures are read where they lie, and each is gone when the next one comes.
+    std::vector<std::string> gray{"enrol", "-o", scratch.file("gray.fir")};
+    for (const char* name : {"bob1", "bob2", "bob3"}) {
+        gray.push_back(scratch.file(name + std::string(".pgm")));
+        const FNImage<unsigned char> picture = Fn::readImage(image(name + std::string(".jpg"))).toMono8();
+        Fn::writeImage(FNImageReferenceFactory::create(picture), gray.back(), FNImageCompressor::LOSSLESS);
+    }
+    EXPECT_EQ(run(gray).lines().at(3)["features"], 3);
 
     const std::string nobody = scratch.file("nobody.fir"),
                       empty = scratch.write("e.pgm", "P5\n4 4\n255\n" + std::string(16, 9));
