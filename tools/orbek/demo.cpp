@@ -164,6 +164,7 @@ int demonstrate(const DemoOptions& options) {
         }
         const bool found = !matches->empty() && matches->front().score > demo.threshold;
         told["identified"] = found ? Json(matches->front().name) : Json();
+        if (found) told["candidate_score"] = rounded(matches->front().score, 6);
         output.result(told);
     }
     demo.seconds = std::chrono::duration<double>(std::chrono::steady_clock::now() - begin).count();

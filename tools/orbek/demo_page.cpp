@@ -90,9 +90,10 @@ public:
     explicit Page(const Demonstration& demo) : demo_(demo) {}
 
     std::string body() {
-        return facts() +
-               section("Enrolled", "One record was made of the pictures of each person.",
-                       "<div class=\"people\">" + all(demo_.people) + "</div>") +
+        // People first, since the pictures refer to theirs.
+        const std::string people = section("Enrolled", "One record was made of the pictures of each person.",
+                                           "<div class=\"people\">" + all(demo_.people) + "</div>");
+        return facts() + people +
                section(
                    "Verified and identified",
                    "These pictures were kept back. Each is compared with the record of the person that it "
