@@ -6,6 +6,7 @@
 #include "parallel.h"
 #include "record_file.h"
 
+#include <algorithm>
 #include <atomic>
 #include <condition_variable>
 #include <mutex>
@@ -38,10 +39,12 @@ public:
         results_.push_back(told);
         changed_.notify_one();
     }
-    /// Waits until all is stored. @throws what has stopped the writing
-    void finish() {
+    /// Waits until all is stored.
+    /// @return how many were not, since other processes had been faster. @throws what has stopped the writing
+    std::size_t finish() {
         close();
         if (failure_) std::rethrow_exception(failure_);
+        return kept_;
     }
 
 private:
@@ -52,9 +55,12 @@ private:
                 const std::vector<GalleryFile::Entry> entries = std::exchange(entries_, {});
                 const std::vector<Json> results = std::exchange(results_, {});
                 lock.unlock();
-                (void)gallery_.add(entries, present_, builder_);
-                for (const Json& result : results) output_.result(result);
+                const std::vector<std::string> kept = gallery_.add(entries, present_, builder_);
+                for (const Json& result : results)
+                    if (std::ranges::find(kept, result["id"].get<std::string>()) == kept.end())
+                        output_.result(result);
                 lock.lock();
+                kept_ += kept.size();
             }
         } catch (...) {
             const std::lock_guard lock(mutex_);
@@ -78,6 +84,7 @@ private:
     std::condition_variable changed_;
     std::vector<GalleryFile::Entry> entries_;
     std::vector<Json> results_;
+    std::size_t kept_ = 0;
     bool closed_ = false;
     std::exception_ptr failure_;
     std::thread thread_; // last: it uses the rest
@@ -103,7 +110,8 @@ int importFolders(const ImportOptions& options) {
     const Configuration configuration = openConfiguration(options.configuration);
     const FIRBuilder builder(configuration);
     std::vector<Enrollment::Processor> processors;
-    for (unsigned int i = 0; i < options.jobs; ++i) processors.emplace_back(configuration);
+    for (std::size_t i = 0; i < std::min<std::size_t>(options.jobs, people.size()); ++i)
+        processors.emplace_back(configuration);
 
     Output output(options, std::accumulate(people.begin(), people.end(), std::size_t{0},
                                            [](std::size_t sum, const auto& folder) {
@@ -135,9 +143,9 @@ int importFolders(const ImportOptions& options) {
                                           {"features", numberOfFeatures(*record)}});
         ++enrolled;
     });
-    writer.finish();
-    output.result({{"enrolled", enrolled.load()},
-                   {"present", all - people.size()},
+    const std::size_t kept = writer.finish();
+    output.result({{"enrolled", enrolled - kept},
+                   {"present", all - people.size() + kept},
                    {"failed", people.size() - enrolled}});
     return output.complained() ? unreadable : done;
 }
