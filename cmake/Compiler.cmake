@@ -1,6 +1,7 @@
 # Flags that hold for every target of the project.
 
-add_compile_options(-Wall -Wextra -Wpedantic -Wshadow -Wnon-virtual-dtor -Woverloaded-virtual)
+add_compile_options(-Wall -Wextra -Wpedantic -Wshadow
+                    $<$<COMPILE_LANGUAGE:CXX>:-Wnon-virtual-dtor> $<$<COMPILE_LANGUAGE:CXX>:-Woverloaded-virtual>)
 # Products and sums round separately everywhere, so that every instruction set gives the bits of the plain form.
 add_compile_options(-ffp-contract=off)
 if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU" AND CMAKE_CXX_COMPILER_VERSION VERSION_LESS 13)

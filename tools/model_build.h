@@ -2,9 +2,6 @@
 
 #include <filesystem>
 #include <iosfwd>
-#include <map>
-#include <memory>
-#include <string>
 
 /// From the compact sources of trained content to the files that the library reads.
 ///
@@ -14,12 +11,6 @@
 /// below etc. Markdown is no source.
 
 namespace Orbek::Models {
-
-/// SHA-256 of a file in hexadecimal digits. @throws FNEIOError
-std::string sha256(const std::filesystem::path& file);
-
-/// Sums by path below etc, from a list in the format of sha256sum. @throws FNEIOError, FNEBadFormat
-std::map<std::string, std::string> readSums(const std::filesystem::path& list);
 
 /// Unpacks all sources, one line to `log` for each. A file is in its place only once it is complete and has
 /// its sum.

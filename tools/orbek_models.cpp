@@ -2,6 +2,7 @@
 
 #include "model_build.h"
 #include "model_files.h"
+#include "model_sums.h"
 
 #include "fn/exception.h"
 

@@ -33,6 +33,7 @@ public:
     }
     /// @throws FNEBadArg for a package of another label or form
     FIR read(const Fn::Package& package) const { return fir(new Record(form_, package)); }
+    FIR read(Fn::PackageView::Bytes package) const { return fir(new Record(form_, package)); }
     FIR read(unsigned char*& memory) const { return fir(new Record(form_, memory)); }
 
     /// @throws std::bad_cast for a record of another generation; FNEBadArg for one of other features

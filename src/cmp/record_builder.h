@@ -4,6 +4,8 @@
 #include "cmp/fir.h"
 #include "cmp/sample.h"
 
+#include <span>
+
 namespace Cmp {
 
 /// Of the samples that a builder holds.
@@ -46,6 +48,10 @@ public:
 
         /// A record from its package form. @throws FNEBadArg if it is another algorithm's or version's
         virtual FIR create(const Fn::Package& package) const = 0;
+        /// The same from the package's bytes.
+        virtual FIR createFromBytes(std::span<const unsigned char> package) const {
+            return create(Fn::Package(package.data(), package.size()));
+        }
         /// A record from its flat form, which must outlive it; moves the pointer behind it.
         virtual FIR createFromMemento(unsigned char*& memory) const = 0;
         /// A record without features.

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "cmp/fir.h"
+#include "fn/package_view.h"
 #include "fn/serialize.h"
 
 #include <cstdint>
@@ -36,7 +37,9 @@ public:
     StoredFeatures(const Form& form, Block features, std::size_t count)
         : form_(form), features_(features.release()), count_(static_cast<std::uint32_t>(count)), owns_(true) {
     }
-    /// @throws FNEBadArg for another label, or features that do not have the form
+    /// @param package its bytes
+    /// @throws FNEBadArg for bytes that are no package, another label, or features that do not have the form
+    StoredFeatures(const Form& form, Fn::PackageView::Bytes package);
     StoredFeatures(const Form& form, const Fn::Package& package);
     /// The flat form at `memory`, which is moved behind it and must outlive this.
     StoredFeatures(const Form& form, unsigned char*& memory);

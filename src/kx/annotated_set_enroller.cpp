@@ -24,11 +24,11 @@ void AnnotatedSetEnroller::enrol(const std::list<Cmp::Face>& faces, const Sample
     forward<EnrolmentInterest::NotEnoughGoodImages, EnrolmentInterest::DoneProcessing>(enroller, *this);
     int index = 0;
     for (const Cmp::Face& face : faces) {
-        const FNImageReference image = Implementation::cachingIntensity(face.image());
-        broadcast(OperationInterest::ProcessingSample{index, image});
+        const Implementation::IntensityCache cache(face.image());
+        broadcast(OperationInterest::ProcessingSample{index, cache.image()});
         const FaceFinder::Location& location = face.faceFinderLocation();
         broadcast(OperationInterest::FaceFound{index, location});
-        enroller.pushSample(index, Cmp::Face(image, location));
+        enroller.pushSample(index, Cmp::Face(cache.image(), location));
         ++index;
     }
     enroller.processSamples();

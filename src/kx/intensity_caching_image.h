@@ -8,7 +8,7 @@
 namespace Kx::Implementation {
 
 /// Another image, of which each gray form is made once: the finders and the comparison algorithm of one
-/// sample ask for the same one in turn.
+/// sample ask for the same one in turn. Once they are dropped, each is made anew whenever it is asked for.
 class IntensityCachingImage final : public FNImageReference::Representation {
 public:
     explicit IntensityCachingImage(const FNImageReference& image) : image_(image) {}
@@ -34,15 +34,26 @@ public:
     bool isColor() const override { return image_.isColor(); }
     FNImageReference::PixelType native() const override { return image_.native(); }
 
+    /// Drops the gray forms, for good.
+    void drop() {
+        const std::lock_guard lock(mutex_);
+        dropped_ = true;
+        mono8_.reset();
+        mono16_.reset();
+        monoFloat_.reset();
+    }
+
 private:
     template <class T> FNImage<T> cached(std::optional<FNImage<T>>& form) const {
         const std::lock_guard lock(mutex_);
+        if (dropped_) return image_.to<T>();
         if (!form) form = image_.to<T>();
         return *form;
     }
 
     FNImageReference image_;
-    mutable std::mutex mutex_; ///< guards the change of the next three from unset to set
+    mutable std::mutex mutex_; ///< guards what follows
+    mutable bool dropped_ = false;
     mutable std::optional<FNImage<unsigned char>> mono8_;
     mutable std::optional<FNImage<unsigned short>> mono16_;
     mutable std::optional<FNImage<float>> monoFloat_;
@@ -51,5 +62,23 @@ private:
 inline FNImageReference cachingIntensity(const FNImageReference& image) {
     return FNImageReference(FNCountedPtr<FNImageReference::Representation>(new IntensityCachingImage(image)));
 }
+
+/// Keeps the gray forms of an image while its sample is worked on. Who holds the image for longer, as a
+/// record builder does with the best ones, does not hold its forms.
+class IntensityCache {
+public:
+    explicit IntensityCache(const FNImageReference& image)
+        : caching_(new IntensityCachingImage(image)),
+          image_(FNCountedPtr<FNImageReference::Representation>(caching_)) {}
+    ~IntensityCache() { caching_->drop(); }
+    IntensityCache(const IntensityCache&) = delete;
+    IntensityCache& operator=(const IntensityCache&) = delete;
+
+    const FNImageReference& image() const { return image_; }
+
+private:
+    IntensityCachingImage* caching_;
+    FNImageReference image_; ///< owns it
+};
 
 } // namespace Kx::Implementation

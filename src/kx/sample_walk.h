@@ -56,7 +56,8 @@ bool walk(const Operation& operation, const EyeSearch& eyes, const std::list<Sen
           Use use) {
     int index = 0;
     for (SensorSample sample : samples) {
-        sample.image = cachingIntensity(sample.image);
+        const IntensityCache cache(sample.image);
+        sample.image = cache.image();
         if (lookAt(operation, eyes, sample, index) && use(sample, index)) return true;
         ++index;
     }
@@ -66,7 +67,8 @@ bool walk(const Operation& operation, const EyeSearch& eyes, const std::list<Sen
 template <class Operation, class Use>
 bool walk(const Operation& operation, const EyeSearch& eyes, const FNImageSet& images, Use use) {
     for (int index = 0; index < images.count(); ++index) {
-        SensorSample sample(cachingIntensity(images[index]));
+        const IntensityCache cache(images[index]);
+        SensorSample sample(cache.image());
         if (lookAt(operation, eyes, sample, index) && use(sample, index)) return true;
     }
     return false;
@@ -77,9 +79,9 @@ template <class Operation, class Use>
 bool walk(const Operation& operation, const std::list<Cmp::Face>& faces, Use use) {
     int index = 0;
     for (const Cmp::Face& face : faces) {
-        const FNImageReference image = cachingIntensity(face.image());
-        operation.broadcast(OperationInterest::ProcessingSample{index, image});
-        const SensorSample sample{image, face.leftEyeLocation(), face.rightEyeLocation()};
+        const IntensityCache cache(face.image());
+        operation.broadcast(OperationInterest::ProcessingSample{index, cache.image()});
+        const SensorSample sample{cache.image(), face.leftEyeLocation(), face.rightEyeLocation()};
         operation.broadcast(OperationInterest::EyesFound{index, *sample.leftEye, *sample.rightEye});
         if (use(sample, index)) return true;
         ++index;

@@ -47,7 +47,9 @@ public:
     Processor& operator=(const Processor&);
     ~Processor();
 
-    /// Looks for the eyes of samples that do not have them.
+    /// Looks for the eyes of samples that do not have them. One picture after the other: once the feedback
+    /// learns of the next one, nothing refers to pixels of those before, which are asked for anew if they are
+    /// needed.
     /// @throws std::exception for an image that cannot be used, and what the feedback throws; end() is not
     /// called then
     void process(SampleIterator first, SampleIterator last, const Feedback& feedback) const;

@@ -29,7 +29,7 @@ FIR FIRBuilder::build(std::istream& stream) const {
 }
 
 FIR FIRBuilder::build(const unsigned char* data, unsigned int size) const {
-    return implementation_->build(Fn::Package(data, size));
+    return FIR::Implementation::make(implementation_->builder->createFromBytes({data, size}));
 }
 
 FIR FIRBuilder::build(unsigned char*& memory) const {

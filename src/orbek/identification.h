@@ -46,7 +46,9 @@ public:
     Processor& operator=(const Processor&);
     ~Processor();
 
-    /// Looks for the eyes of samples that do not have them.
+    /// Looks for the eyes of samples that do not have them. One picture after the other: once the feedback
+    /// learns of the next one, nothing refers to pixels of those before, which are asked for anew if they are
+    /// needed.
     /// @param threshold matches have scores above it
     /// @param maxMatches to list at most
     /// @throws std::exception for an image or a population that cannot be used, and what the feedback throws;

@@ -1,4 +1,5 @@
 #include "fn/byte_order.h"
+#include "fn/package_view.h"
 #include "fn/serialize.h"
 #include "support/thrown.h"
 
@@ -130,6 +131,10 @@ TEST(Package, TruncatedMemoryIsRefused) {
         const char* const step = size < 4 ? "number of cores" : size < 4 + 4 * 5 ? "sizes of cores" : "core";
         EXPECT_EQ(thrownBy([&] { Package(whole.data(), size); }),
                   std::string("FNEBadArg: creating Package from memory: reading ") + step);
+        EXPECT_EQ(thrownBy([&] {
+                      Fn::PackageView({whole.data(), size});
+                  }),
+                  std::string("FNEBadArg: creating Package from memory: reading ") + step);
         std::istringstream stream(std::string(whole.begin(), whole.begin() + size));
         EXPECT_THROW(Package{stream}, FNEIOError);
     }
@@ -206,6 +211,25 @@ TEST(Package, WrongShapesAreNamed) {
          "inconsistency detected converting to list<Package> from an invalid package"},
     };
     for (const auto& c : cases) EXPECT_EQ(thrownBy(c.call), std::string("FNEBadArg: ") + c.text);
+}
+
+TEST(PackageView, ReadsListsWhereTheyLie) {
+    const Bytes bytes = bytesOf(Package(std::list<Package>{
+        Package(7), Fn::serialize<std::string>("bob"), Package(std::list<Package>{Package(8), Package()})}));
+    Fn::PackageListView list{Fn::PackageView(bytes)};
+    ASSERT_EQ(list.remaining(), 3u);
+    EXPECT_EQ(list.next().toUInt32(), 7u);
+    Fn::PackageView text = list.next();
+    EXPECT_EQ(text.count(), 1u);
+    const auto core = text.take();
+    EXPECT_EQ(std::string(core.begin(), core.end()), std::string("bob", 4));
+    Fn::PackageListView inner(list.next());
+    EXPECT_EQ(inner.next().toUInt32(), 8u);
+    const Fn::PackageView empty = inner.next();
+    EXPECT_EQ(empty.count(), 0u);
+    EXPECT_THROW(empty.toUInt32(), FNEBadArg);
+    EXPECT_THROW(Fn::PackageListView{empty}, FNEBadArg);
+    EXPECT_THROW(inner.next(), FNEBadArg);
 }
 
 TEST(Package, AFailedWriteIsReported) {

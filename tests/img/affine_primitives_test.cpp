@@ -194,22 +194,25 @@ TEST(AreaAverages, OfColoursAreThoseOfTheirChannels) {
     } cases[] = {{sourceAlignedFractionalAveraging, Plain::sourceAligned, true},
                  {integerAveraging, Plain::integerAverage, true},
                  {bilinearInterpolationFixedpoint, Plain::bilinearBox, false}};
-    for (const auto& c : cases) {
-        Color dst(13, 11);
-        c.color(src, dst, box);
-        for (const auto channel : {&Fn::Bgra32::r, &Fn::Bgra32::g, &Fn::Bgra32::b}) {
-            Words plane(src.w(), src.h());
-            for (std::uint64_t i = 0; i < src.size(); ++i) {
-                const unsigned short v = src.data()[i].*channel;
-                plane.getExclusive()[i] = static_cast<unsigned short>(c.widens ? v << 8 | 128 : v);
-            }
-            const Words expected = c.plain(plane, box, 13, 11);
-            for (std::uint64_t i = 0; i < dst.size(); ++i) {
-                ASSERT_EQ(dst.data()[i].*channel, c.widens ? expected.data()[i] >> 8 : expected.data()[i]);
-                ASSERT_EQ(dst.data()[i].a, 255);
+    forEachTarget([&] {
+        for (const auto& c : cases) {
+            Color dst(13, 11);
+            c.color(src, dst, box);
+            for (const auto channel : {&Fn::Bgra32::r, &Fn::Bgra32::g, &Fn::Bgra32::b}) {
+                Words plane(src.w(), src.h());
+                for (std::uint64_t i = 0; i < src.size(); ++i) {
+                    const unsigned short v = src.data()[i].*channel;
+                    plane.getExclusive()[i] = static_cast<unsigned short>(c.widens ? v << 8 | 128 : v);
+                }
+                const Words expected = c.plain(plane, box, 13, 11);
+                for (std::uint64_t i = 0; i < dst.size(); ++i) {
+                    ASSERT_EQ(dst.data()[i].*channel,
+                              c.widens ? expected.data()[i] >> 8 : expected.data()[i]);
+                    ASSERT_EQ(dst.data()[i].a, 255);
+                }
             }
         }
-    }
+    });
 }
 
 TEST(FourToThree, EqualsItsPlainForm) {
@@ -258,6 +261,32 @@ TEST(Bilinear, FixedPointParallelogramsEqualTheirPlainForm) {
                             "not allowed)!"
                           : "nothing thrown");
     }
+}
+
+TEST(Bilinear, ColorsAreSampledChannelByChannel) {
+    forEachTarget([] {
+        RandomImages random(8);
+        for (int round = 0; round < 60; ++round) {
+            const auto src = random.image<Fn::Bgra32>(random.number(1, 30), random.number(1, 30));
+            const auto vector = [&] { return FN2Vector<float>(random.real(-30, 30), random.real(-30, 30)); };
+            const FNPos origin(random.real(-5, 25), random.real(-5, 25));
+            const FN2Vector<float> u = vector(), v = vector();
+            FNImage<Fn::Bgra32> dst(static_cast<std::uint32_t>(random.number(1, 40)),
+                                    static_cast<std::uint32_t>(random.number(1, 20)));
+            bilinearInterpolationFixedpoint(src, dst, origin, u, v, true, {1, 2, 3});
+            for (const auto channel : {&Fn::Bgra32::b, &Fn::Bgra32::g, &Fn::Bgra32::r}) {
+                Words plane(src.w(), src.h());
+                std::ranges::transform(src.span(), plane.getExclusive(),
+                                       [&](const Fn::Bgra32& pixel) { return pixel.*channel; });
+                const Words expected = Plain::bilinear(plane, dst.w(), dst.h(), origin, u, v, [&] {
+                    return static_cast<unsigned short>(Fn::Bgra32(1, 2, 3).*channel);
+                });
+                for (std::uint64_t i = 0; i < dst.size(); ++i)
+                    ASSERT_EQ(dst.data()[i].*channel, expected.data()[i]) << round << ", pixel " << i;
+            }
+            for (const Fn::Bgra32& pixel : dst.span()) ASSERT_EQ(pixel.a, 255);
+        }
+    });
 }
 
 /// One float sample by the rule for neighbours outside: a value inside along the same row or column, or the

@@ -1,4 +1,5 @@
 #include "model_build.h"
+#include "model_sums.h"
 #include "model_files.h"
 
 #include "support/thrown_text.h"

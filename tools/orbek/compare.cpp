@@ -13,9 +13,8 @@
 namespace Orbek::Tool {
 namespace {
 
-struct CompareOptions {
+struct CompareOptions : CommonOptions {
     std::string first, second;
-    std::string configuration;
 };
 
 int compare(const CompareOptions& options) {
@@ -24,9 +23,9 @@ int compare(const CompareOptions& options) {
     const FIR first = readRecord(builder, options.first), second = readRecord(builder, options.second);
     const Score score = FacialMatchingEngine(configuration).compare(first, second);
     const ScoreMappings mappings(configuration);
-    Output(1).result({{"score", rounded(score, 6)},
-                      {"far", rounded(mappings.expectedFAR(score), 8)},
-                      {"frr", rounded(mappings.expectedFRR(score), 8)}});
+    Output(options).result({{"score", rounded(score, 6)},
+                            {"far", rounded(mappings.expectedFAR(score), 8)},
+                            {"frr", rounded(mappings.expectedFRR(score), 8)}});
     return done;
 }
 
@@ -34,14 +33,13 @@ int compare(const CompareOptions& options) {
 
 Command compareCommand(CLI::App& program) {
     const auto options = std::make_shared<CompareOptions>();
-    CLI::App* const app = program.add_subcommand(
-        "compare", "Compare two records.\n"
-                   "Prints one JSON object: the score, and the rates of false acceptance and false rejection "
-                   "of a threshold of that score.");
+    CLI::App* const app = addCommand(program, "compare",
+                                     "Compare two records.\n"
+                                     "Tells the score, and the rates of false acceptance (far) and false "
+                                     "rejection (frr) of a threshold of that score.",
+                                     *options);
     app->add_option("first", options->first, "File of a record")->required()->type_name("FILE");
     app->add_option("second", options->second, "File of another one")->required()->type_name("FILE");
-    app->add_option("--config", options->configuration, "Configuration file in place of the installed one")
-        ->type_name("FILE");
     return {app, [options] { return compare(*options); }};
 }
 

@@ -21,8 +21,12 @@ std::string installedFile() {
 
 } // namespace
 
+std::string configurationFile(const std::string& fileName) {
+    return fileName.empty() ? installedFile() : fileName;
+}
+
 Configuration openConfiguration(const std::string& fileName) {
-    const std::string name = fileName.empty() ? installedFile() : fileName;
+    const std::string name = configurationFile(fileName);
     std::ifstream file(name);
     if (!file || fs::is_directory(name)) throw std::runtime_error(name + ": cannot be opened for reading");
     try {

@@ -6,12 +6,12 @@
 #include "feature_finders.h"
 #include "orbek/implementation/adapt.h"
 #include "output.h"
+#include "parallel.h"
 #include "pictures.h"
 
-#include <atomic>
 #include <memory>
+#include <mutex>
 #include <optional>
-#include <thread>
 
 #include <nlohmann/json.hpp>
 
@@ -20,13 +20,12 @@ namespace {
 
 using Json = nlohmann::ordered_json;
 
-struct FindOptions {
+struct FindOptions : CommonOptions {
     std::vector<std::string> images;
-    std::string configuration;
     std::string drawFolder;
     float minEye = 0.05f, maxEye = 0.4f;
     std::vector<int> box;
-    unsigned int jobs = 1;
+    unsigned int jobs = 0;
 };
 
 /// What was found of a face; what is not there was not found.
@@ -98,18 +97,14 @@ class FindRun {
 public:
     explicit FindRun(const FindOptions& options)
         : options_(options), files_(pictureFiles(options.images)),
-          finders_(openConfiguration(options.configuration)), output_(files_.size()) {
+          finders_(openConfiguration(options.configuration)), output_(options, files_.size()) {
         if (!options.drawFolder.empty()) drawings_.emplace(options.drawFolder, files_);
         lines_.resize(files_.size());
     }
 
     int run() {
-        std::vector<std::thread> threads;
-        const std::size_t jobs = std::min<std::size_t>(std::max(options_.jobs, 1u), files_.size());
-        for (std::size_t job = 1; job < jobs; ++job) threads.emplace_back([this] { work(); });
-        work();
-        for (std::thread& thread : threads) thread.join();
-        if (failure_) std::rethrow_exception(failure_);
+        inParallel(options_.jobs, files_.size(),
+                   [this](std::size_t, std::size_t index) { finish(index, process(index)); });
         return output_.complained() ? unreadable : done;
     }
 
@@ -119,18 +114,6 @@ private:
         Json json;
         std::string complaint;
     };
-
-    void work() {
-        for (std::size_t i; (i = next_++) < files_.size();) {
-            try {
-                finish(i, process(i));
-            } catch (...) {
-                const std::lock_guard lock(mutex_);
-                if (!failure_) failure_ = std::current_exception();
-                next_ = files_.size();
-            }
-        }
-    }
 
     Line process(std::size_t index) const {
         FNImageReference reference;
@@ -170,27 +153,22 @@ private:
     const Finders finders_;
     std::optional<PictureFolder> drawings_;
     Output output_;
-    std::atomic<std::size_t> next_ = 0;
     std::mutex mutex_; ///< guards the rest
     std::vector<std::optional<Line>> lines_;
     std::size_t printed_ = 0;
-    std::exception_ptr failure_;
 };
 
 } // namespace
 
 Command findCommand(CLI::App& program) {
     const auto options = std::make_shared<FindOptions>();
-    CLI::App* const app = program.add_subcommand(
-        "find",
-        "Find faces, eyes, mouth and bridge of the nose in images.\n"
-        "Prints one JSON object for each image, in pixels of the upright image; left and right are those of "
-        "the observer.");
-    app->add_option("images", options->images, "Image files, or folders of them")
-        ->required()
-        ->type_name("IMAGE");
-    app->add_option("--config", options->configuration, "Configuration file in place of the installed one")
-        ->type_name("FILE");
+    CLI::App* const app =
+        addCommand(program, "find",
+                   "Find faces, eyes, mouth and bridge of the nose in images.\n"
+                   "Tells of each image, in pixels of the upright image; left and right are "
+                   "those of the observer.",
+                   *options);
+    addImages(*app, options->images);
     app->add_option("--draw", options->drawFolder, "Folder for the pictures with boxes, eyes and ids drawn")
         ->type_name("DIR");
     app->add_option("--min-eye", options->minEye, "Smallest eye distance, in widths of the image")
@@ -200,9 +178,7 @@ Command findCommand(CLI::App& program) {
     app->add_option("--box", options->box, "Where to look: two corners, in pixels of the upright image")
         ->expected(4)
         ->type_name("X0 Y0 X1 Y1");
-    app->add_option("--jobs", options->jobs, "Images at a time")
-        ->check(CLI::Range(1u, 1024u))
-        ->capture_default_str();
+    addJobs(*app, options->jobs);
     return {app, [options] { return FindRun(*options).run(); }};
 }
 

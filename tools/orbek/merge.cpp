@@ -13,10 +13,9 @@
 namespace Orbek::Tool {
 namespace {
 
-struct MergeOptions {
+struct MergeOptions : CommonOptions {
     std::vector<std::string> records;
     std::string merged;
-    std::string configuration;
 };
 
 int merge(const MergeOptions& options) {
@@ -27,7 +26,7 @@ int merge(const MergeOptions& options) {
     for (std::size_t i = 1; i < options.records.size(); ++i)
         merged = processor.merge(readRecord(builder, options.records[i]), merged);
     writeRecord(merged, options.merged);
-    Output(1).result(describeRecord(merged, options.merged));
+    Output(options).result(describeRecord(merged, options.merged));
     return done;
 }
 
@@ -35,12 +34,10 @@ int merge(const MergeOptions& options) {
 
 Command mergeCommand(CLI::App& program) {
     const auto options = std::make_shared<MergeOptions>();
-    CLI::App* const app = program.add_subcommand(
-        "merge", "Make one record from several of one person.\nPrints one JSON object for the new record.");
+    CLI::App* const app = addCommand(
+        program, "merge", "Make one record from several of one person.\nTells of the new record.", *options);
     app->add_option("records", options->records, "Files of records")->required()->type_name("FILE");
     app->add_option("-o,--output", options->merged, "File for the new record")->required()->type_name("FILE");
-    app->add_option("--config", options->configuration, "Configuration file in place of the installed one")
-        ->type_name("FILE");
     return {app, [options] { return merge(*options); }};
 }
 

@@ -1,5 +1,6 @@
 #include "output.h"
 
+#include <algorithm>
 #include <cmath>
 #include <iostream>
 
@@ -9,11 +10,44 @@
 namespace Orbek::Tool {
 namespace {
 
+using Json = nlohmann::ordered_json;
+
 constexpr int barWidth = 40;
+
+/// The text of a value of any kind. File names need not be UTF-8.
+std::string plain(const Json& value) {
+    if (value.is_string()) return value.get<std::string>();
+    return value.dump(-1, ' ', false, Json::error_handler_t::replace);
+}
+
+/// What tells whose result it is.
+bool isHeading(const std::string& key) {
+    return key == "file" || key == "id";
+}
+
+std::string valueText(const Json& value) {
+    std::string text;
+    if (value.is_array()) {
+        for (const Json& element : value) text += (text.empty() ? "" : ", ") + plain(element);
+        return "(" + text + ")";
+    }
+    if (!value.is_object()) return plain(value);
+    for (const auto& [key, element] : value.items())
+        text += (text.empty() ? "" : " ") + key + " " + valueText(element);
+    return text;
+}
+
+std::string fieldText(std::string key, const Json& value) {
+    std::ranges::replace(key, '_', ' ');
+    if (value.is_null() || value == false) return "no " + key;
+    if (value == true) return key;
+    return key + " " + valueText(value);
+}
 
 } // namespace
 
-Output::Output(std::size_t steps) : steps_(steps), terminal_(isatty(STDERR_FILENO) == 1) {
+Output::Output(const CommonOptions& options, std::size_t steps)
+    : steps_(steps), json_(options.json), bar_(!options.quiet && steps > 1 && isatty(STDERR_FILENO) == 1) {
     drawBar();
 }
 
@@ -22,8 +56,11 @@ Output::~Output() {
 }
 
 void Output::result(const nlohmann::ordered_json& json) {
-    // File names need not be UTF-8.
-    const std::string line = json.dump(-1, ' ', false, nlohmann::ordered_json::error_handler_t::replace);
+    result(json, json_ ? "" : readableText(json));
+}
+
+void Output::result(const nlohmann::ordered_json& json, const std::string& text) {
+    const std::string line = json_ ? plain(json) : text;
     const std::lock_guard lock(mutex_);
     removeBar();
     std::cout << line << "\n" << std::flush;
@@ -51,13 +88,29 @@ void Output::removeBar() {
 }
 
 void Output::drawBar() {
-    if (!terminal_ || steps_ < 2) return;
+    if (!bar_) return;
     const int filled = static_cast<int>(barWidth * done_ / steps_);
     if (filled == shownWidth_) return;
     shownWidth_ = filled;
     std::cerr << "\r[" << std::string(static_cast<std::size_t>(filled), '#')
               << std::string(static_cast<std::size_t>(barWidth - filled), '.') << "] " << done_ << "/"
               << steps_ << std::flush;
+}
+
+std::string readableText(const nlohmann::ordered_json& json) {
+    std::string heading, fields, lists;
+    for (const auto& [key, value] : json.items()) {
+        if (isHeading(key) && heading.empty()) {
+            heading = plain(value);
+            continue;
+        }
+        fields += fields.empty() ? "" : ", ";
+        const bool list = value.is_array() && (value.empty() || value.front().is_object());
+        fields += list ? std::to_string(value.size()) + " " + key : fieldText(key, value);
+        if (list)
+            for (const Json& element : value) lists += "\n  " + readableText(element);
+    }
+    return heading + (heading.empty() || fields.empty() ? "" : ": ") + fields + lists;
 }
 
 double rounded(double value, int decimals) {

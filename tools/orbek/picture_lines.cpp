@@ -1,19 +1,10 @@
 #include "picture_lines.h"
 
-#include "pictures.h"
-
 namespace Orbek::Tool {
 
-std::list<Sample> readSamples(const std::vector<std::filesystem::path>& files, Output& output) {
+std::list<Sample> samplesOf(const std::vector<std::filesystem::path>& files) {
     std::list<Sample> samples;
-    for (const std::filesystem::path& file : files) {
-        try {
-            samples.emplace_back(readPicture(file));
-        } catch (const std::exception& e) {
-            output.complaint(file.string(), e.what());
-        }
-        output.step();
-    }
+    for (const std::filesystem::path& file : files) samples.emplace_back(Image(new PictureFile(file)));
     return samples;
 }
 

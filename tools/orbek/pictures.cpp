@@ -29,18 +29,50 @@ bool isImageName(const fs::path& file) {
     return std::find(imageEndings.begin(), imageEndings.end(), ending) != imageEndings.end();
 }
 
-std::vector<fs::path> picturesIn(const fs::path& folder) {
-    std::vector<fs::path> files;
-    std::error_code failure;
+/// Image files, and folders that are neither hidden nor links, each in order.
+struct FolderContent {
+    std::vector<fs::path> pictures, folders;
+};
+
+FolderContent contentOf(const fs::path& folder) {
+    FolderContent content;
+    std::error_code failure, ignored;
     for (fs::directory_iterator entry(folder, failure), end; !failure && entry != end;
-         entry.increment(failure))
-        if (isImageName(entry->path()) && !entry->is_directory()) files.push_back(entry->path());
+         entry.increment(failure)) {
+        const fs::path& path = entry->path();
+        if (!entry->is_directory(ignored)) {
+            if (isImageName(path)) content.pictures.push_back(path);
+        } else if (!entry->is_symlink(ignored) && path.filename().native().front() != '.')
+            content.folders.push_back(path);
+    }
     if (failure) throw std::runtime_error(folder.string() + ": " + failure.message());
+    for (std::vector<fs::path>* const paths : {&content.pictures, &content.folders})
+        std::ranges::sort(*paths, [](const fs::path& a, const fs::path& b) {
+            return strverscmp(a.filename().c_str(), b.filename().c_str()) < 0;
+        });
+    return content;
+}
+
+std::vector<fs::path> picturesIn(const fs::path& folder) {
+    const std::vector<fs::path> files = contentOf(folder).pictures;
     if (files.empty()) throw std::runtime_error(folder.string() + ": has no image files");
-    std::sort(files.begin(), files.end(), [](const fs::path& a, const fs::path& b) {
-        return strverscmp(a.filename().c_str(), b.filename().c_str()) < 0;
-    });
     return files;
+}
+
+void addFolder(const fs::path& folder, const std::string& name, PictureTree& tree) {
+    const FolderContent content = contentOf(folder);
+    if (name.empty() && !content.pictures.empty())
+        tree.complaints.push_back(folder.string() + ": " + std::to_string(content.pictures.size()) +
+                                  " image files outside its folders are left out");
+    else if (!content.pictures.empty())
+        tree.folders.push_back({name, content.pictures});
+    for (const fs::path& below : content.folders) {
+        try {
+            addFolder(below, (name.empty() ? "" : name + "/") + below.filename().string(), tree);
+        } catch (const std::exception& e) {
+            tree.complaints.emplace_back(e.what());
+        }
+    }
 }
 
 template <class T> FNImageReference turned(const FNImage<T>& image, Orientation orientation) {
@@ -70,6 +102,12 @@ template <class T> FNImageReference turned(const FNImage<T>& image, Orientation 
     return FNImageReferenceFactory::create(result());
 }
 
+FNImageReference blackPixel() {
+    FNImage<unsigned char> image(1, 1);
+    image.fill(0);
+    return FNImageReferenceFactory::create(image);
+}
+
 } // namespace
 
 std::vector<fs::path> pictureFiles(const std::vector<std::string>& arguments) {
@@ -86,6 +124,13 @@ std::vector<fs::path> pictureFiles(const std::vector<std::string>& arguments) {
     return files;
 }
 
+PictureTree picturesBelow(const fs::path& root) {
+    PictureTree tree;
+    addFolder(root, "", tree);
+    if (tree.folders.empty()) throw std::runtime_error(root.string() + ": has no folders with image files");
+    return tree;
+}
+
 FNImageReference upright(const FNImageReference& image, Orientation orientation) {
     if (orientation == Orientation::Upright || image.w() == 0) return image;
     return image.isColor() ? turned(image.toBgra32(), orientation) : turned(image.toMono8(), orientation);
@@ -97,8 +142,21 @@ FNImageReference readUpright(const fs::path& file) {
     return upright(Fn::readImage(file.string()), orientation);
 }
 
-Image readPicture(const fs::path& file) {
-    return adapt(readUpright(file), file.string());
+Image PictureFile::picture() const {
+    const std::lock_guard lock(mutex_);
+    if (!picture_) picture_ = adapt(blank_ ? blackPixel() : readUpright(file_), file_.string());
+    return picture_;
+}
+
+void PictureFile::forget() const {
+    const std::lock_guard lock(mutex_);
+    picture_ = Image();
+}
+
+void PictureFile::blank() const {
+    const std::lock_guard lock(mutex_);
+    blank_ = true;
+    picture_ = Image();
 }
 
 PictureFolder::PictureFolder(const std::string& folder, const std::vector<fs::path>& sources) {

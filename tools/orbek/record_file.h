@@ -2,6 +2,7 @@
 
 #include "orbek/fir_builder.h"
 
+#include <cstdint>
 #include <string>
 
 #include <nlohmann/json_fwd.hpp>
@@ -10,11 +11,12 @@
 
 namespace Orbek::Tool {
 
-/// @throws std::runtime_error naming the file and what is wrong with it
+/// @throws UnreadableInput naming the file and what is wrong with it
 FIR readRecord(const FIRBuilder& builder, const std::string& file);
 /// Writes the whole file or, if that fails, none. @throws std::runtime_error naming the file
 void writeRecord(const FIR& record, const std::string& file);
 
+std::uint32_t numberOfFeatures(const FIR& record);
 /// File, version, number of features and bytes.
 nlohmann::ordered_json describeRecord(const FIR& record, const std::string& file);
 

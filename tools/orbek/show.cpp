@@ -12,14 +12,13 @@
 namespace Orbek::Tool {
 namespace {
 
-struct ShowOptions {
+struct ShowOptions : CommonOptions {
     std::vector<std::string> records;
-    std::string configuration;
 };
 
 int show(const ShowOptions& options) {
     const FIRBuilder builder(openConfiguration(options.configuration));
-    Output output(options.records.size());
+    Output output(options, options.records.size());
     for (const std::string& file : options.records) {
         try {
             output.result(describeRecord(readRecord(builder, file), file));
@@ -35,11 +34,9 @@ int show(const ShowOptions& options) {
 
 Command showCommand(CLI::App& program) {
     const auto options = std::make_shared<ShowOptions>();
-    CLI::App* const app = program.add_subcommand(
-        "show", "Describe records.\nPrints one JSON object for each: version, features and bytes.");
+    CLI::App* const app =
+        addCommand(program, "show", "Describe records: version, features and bytes of each.", *options);
     app->add_option("records", options->records, "Files of records")->required()->type_name("FILE");
-    app->add_option("--config", options->configuration, "Configuration file in place of the installed one")
-        ->type_name("FILE");
     return {app, [options] { return show(*options); }};
 }
 

@@ -22,9 +22,8 @@ using Json = nlohmann::ordered_json;
 
 const std::string trackerKey = "ORBEK.FaceTracker.";
 
-struct TrackOptions {
+struct TrackOptions : CommonOptions {
     std::vector<std::string> images;
-    std::string configuration;
     std::string drawFolder;
     std::optional<float> framesPerSecond, minEye, maxEye;
     bool sparse = false;
@@ -62,7 +61,7 @@ int track(const TrackOptions& options) {
     if (!options.drawFolder.empty()) drawings.emplace(options.drawFolder, files);
 
     TrackNumbers numbers;
-    Output output(files.size());
+    Output output(options, files.size());
     for (std::size_t frame = 0; frame < files.size(); ++frame, output.step()) {
         const auto time =
             static_cast<unsigned int>(std::llround(static_cast<double>(frame) * 1000 / frameRate));
@@ -102,15 +101,12 @@ int track(const TrackOptions& options) {
 
 Command trackCommand(CLI::App& program) {
     const auto options = std::make_shared<TrackOptions>();
-    CLI::App* const app = program.add_subcommand(
-        "track", "Follow faces through the frames of a video.\n"
-                 "Prints one JSON object for each frame; a face has the same id (and number of its track) as "
-                 "long as it is followed.");
-    app->add_option("images", options->images, "The frames in order: image files, or folders of them")
-        ->required()
-        ->type_name("IMAGE");
-    app->add_option("--config", options->configuration, "Configuration file in place of the installed one")
-        ->type_name("FILE");
+    CLI::App* const app = addCommand(program, "track",
+                                     "Follow faces through the frames of a video.\n"
+                                     "Tells of each frame; a face has the same id (and number of its track) "
+                                     "as long as it is followed.",
+                                     *options);
+    addImages(*app, options->images, "The frames in order: image files, or folders of them");
     app->add_option("--draw", options->drawFolder, "Folder for the frames with boxes and track numbers drawn")
         ->type_name("DIR");
     app->add_option("--fps", options->framesPerSecond, "Frames per second; the configuration's otherwise");

@@ -4,7 +4,6 @@
 #include "configuration_file.h"
 #include "orbek/verification.h"
 #include "picture_lines.h"
-#include "pictures.h"
 #include "record_file.h"
 
 #include <memory>
@@ -15,12 +14,11 @@ namespace {
 
 enum VerifyStatus : int { same = 0, other = 1, undecided = 2 };
 
-struct VerifyOptions {
+struct VerifyOptions : CommonOptions {
     std::string record;
     std::vector<std::string> images;
     float far = 0.001f;
     std::optional<float> score;
-    std::string configuration;
 };
 
 class Verified final : public PictureLines<Verification::FeedbackBody> {
@@ -41,8 +39,8 @@ int verify(const VerifyOptions& options) {
     const Score threshold =
         options.score ? Score(*options.score) : ScoreMappings(configuration).requestFAR(options.far);
     const Verification::Processor processor(configuration);
-    Output output(files.size());
-    const std::list<Sample> samples = readSamples(files, output);
+    Output output(options, files.size());
+    const std::list<Sample> samples = samplesOf(files);
     bool matched = false;
     processor.process(samples.begin(), samples.end(), record, threshold,
                       Verification::Feedback(new Verified(output, matched)));
@@ -54,21 +52,19 @@ int verify(const VerifyOptions& options) {
 
 Command verifyCommand(CLI::App& program) {
     const auto options = std::make_shared<VerifyOptions>();
-    CLI::App* const app = program.add_subcommand(
-        "verify", "Tell whether pictures show the person of a record.\n"
-                  "Prints one JSON object for each picture up to the first that is accepted, and at last one "
-                  "for the outcome.\nExit status: 0 a match, 1 no match, 2 something went wrong.");
+    CLI::App* const app =
+        addCommand(program, "verify",
+                   "Tell whether pictures show the person of a record.\n"
+                   "Tells of each picture up to the first that is accepted, and at last of the outcome.\n"
+                   "Exit status: 0 a match, 1 no match, 2 something went wrong.",
+                   *options);
     app->add_option("record", options->record, "File of the record")->required()->type_name("FILE");
-    app->add_option("images", options->images, "Image files, or folders of them")
-        ->required()
-        ->type_name("IMAGE");
+    addImages(*app, options->images);
     CLI::Option* const score = app->add_option("--score", options->score, "Least score of a match, 0 to 1");
     app->add_option("--far", options->far, "Share of other people that may be taken for the person")
         ->check(CLI::Range(0.0f, 1.0f))
         ->capture_default_str()
         ->excludes(score);
-    app->add_option("--config", options->configuration, "Configuration file in place of the installed one")
-        ->type_name("FILE");
     return {app, [options] { return verify(*options); }, undecided};
 }
 

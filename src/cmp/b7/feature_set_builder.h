@@ -28,6 +28,9 @@ public:
     std::size_t dumpSize() const override { return core_->largestRecord().serialize().size(); }
     std::size_t numberOfSamples() const override { return selection_.size(); }
     FIR create(const Fn::Package& package) const override { return core_->records().read(package); }
+    FIR createFromBytes(std::span<const unsigned char> package) const override {
+        return core_->records().read(package);
+    }
     FIR createFromMemento(unsigned char*& memory) const override { return core_->records().read(memory); }
     FIR createVoid() const override { return core_->record({}); }
 

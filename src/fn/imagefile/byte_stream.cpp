@@ -30,24 +30,31 @@ std::string peekBytes(std::istream& stream, std::size_t n, const char* caller) {
     return bytes;
 }
 
-FNRMem<unsigned char> readRest(std::istream& stream, std::uint64_t maxBytes, const char* caller) {
+FNRMem<unsigned char> readUpTo(std::istream& stream, std::uint64_t n, const char* caller) {
     if (!stream) refuse(caller);
-    constexpr std::size_t firstStep = 1u << 16;
+    constexpr std::uint64_t firstStep = 1u << 16;
     std::vector<unsigned char> bytes;
     // Memory follows what has arrived: each step doubles it.
-    for (std::size_t step = firstStep; stream; step = bytes.size()) {
+    while (stream && bytes.size() < n) {
         const std::size_t before = bytes.size();
+        const std::uint64_t step = std::min(std::max<std::uint64_t>(before, firstStep), n - before);
         bytes.resize(before + step);
         stream.read(reinterpret_cast<char*>(bytes.data() + before), static_cast<std::streamsize>(step));
         bytes.resize(before + static_cast<std::size_t>(stream.gcount()));
-        if (bytes.size() > maxBytes)
-            FN_THROW(FNEBadFormat, std::string(caller) + ": the file exceeds the limit of " +
-                                       std::to_string(maxBytes) + " bytes for decoding");
     }
     if (stream.bad()) refuse(caller);
     FNRMem<unsigned char> result(bytes.size());
     std::copy(bytes.begin(), bytes.end(), result.getExclusive());
     return result;
+}
+
+FNRMem<unsigned char> readRest(std::istream& stream, std::uint64_t maxBytes, const char* caller) {
+    const FNRMem<unsigned char> bytes =
+        readUpTo(stream, std::max(maxBytes, maxBytes + 1), caller); // one more tells that there are more
+    if (bytes.size() > maxBytes)
+        FN_THROW(FNEBadFormat, std::string(caller) + ": the file exceeds the limit of " +
+                                   std::to_string(maxBytes) + " bytes for decoding");
+    return bytes;
 }
 
 std::ifstream openForReading(const std::string& fileName, const char* failure) {

@@ -18,6 +18,10 @@ namespace Fn {
 /// cannot go back.
 std::string peekBytes(std::istream& stream, std::size_t n, const char* caller);
 
+/// Up to `n` next bytes, fewer at the end of the stream; memory follows what has arrived. @throws FNEIOError
+/// if the stream is bad.
+FNRMem<unsigned char> readUpTo(std::istream& stream, std::uint64_t n, const char* caller);
+
 /// Everything from the present position. @throws FNEBadFormat if that is more than `maxBytes`; FNEIOError if
 /// the stream is bad.
 FNRMem<unsigned char> readRest(std::istream& stream, std::uint64_t maxBytes, const char* caller);

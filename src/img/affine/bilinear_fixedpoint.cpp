@@ -1,3 +1,4 @@
+#include "img/affine/bilinear_kernel.h"
 #include "img/affine/primitives.h"
 
 #include <algorithm>
@@ -93,6 +94,10 @@ public:
     }
 
     void sampleInside(std::int64_t begin, std::int64_t end, T* out) const {
+        if constexpr (std::is_same_v<T, Fn::Bgra32>)
+            if (end - begin >= 2)
+                return Kernels::sampleInside(src_.data(), src_.w(), {x_, y_, xStep_, yStep_}, begin, end,
+                                             out);
         const std::uint32_t w = src_.w();
         Fixed x = x_ + begin * xStep_, y = y_ + begin * yStep_;
         for (std::int64_t i = begin; i < end; ++i, x += xStep_, y += yStep_) {

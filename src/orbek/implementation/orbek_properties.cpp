@@ -7,12 +7,16 @@
 #include "eye/tracker/reference_face_tracker.h"
 #include "fg/capture_types.h"
 #include "fn/deployment/composite_values.h"
+#include "kx/feature_test.h"
+#include "kx/full_frontal_creator.h"
+#include "kx/full_frontal_test.h"
 #include "kx/set_enroller.h"
 #include "kx/set_identifier.h"
 #include "kx/set_recognizer.h"
 #include "kx/stream_enroller.h"
 #include "kx/stream_identifier.h"
 #include "kx/stream_recognizer.h"
+#include "kx/token_face.h"
 
 namespace Orbek {
 
@@ -60,11 +64,13 @@ std::list<Property> members() {
         property<Kx::SetIdentifier>::create("SetIdentifier", "Set Identifier"),
         property<Eye::ReferenceFaceTracker>::create("FaceTracker", "Face Tracker Engine"),
         property<Cmp::Portrait::Analyzer>::create("PortraitAnalyzer", "Portrait Analyzer"),
-        pending("ISOFullFrontalTest", "Kx::ISO_19794_5::FullFrontal::Test",
-                "ISO 19794-5 Full Frontal images assessment"),
-        pending("FeatureTest", "Kx::Feature::Test", "Portrait feature assessment"),
-        pending("CropFullFrontal", "CropToFullFrontal", "ISO 19794-5 Full Frontal images cropping"),
-        pending("CropTokenImage", "CropToTokenImage", "ISO 19794-5 Token images cropping"),
+        property<Kx::ISO_19794_5::FullFrontal::Test>::create("ISOFullFrontalTest",
+                                                             "ISO 19794-5 Full Frontal images assessment"),
+        property<Kx::Feature::Test>::create("FeatureTest", "Portrait feature assessment"),
+        property<Kx::FullFrontal::Creator>::create("CropFullFrontal",
+                                                   "ISO 19794-5 Full Frontal images cropping"),
+        property<Kx::TokenFace::CropTokenImage>::create("CropTokenImage",
+                                                        "ISO 19794-5 Token images cropping"),
         property<FG::DllFrameGrabberFactoryCacheDef>::create(
             "FgDllCache", "Definition of DLL load paths for capture devices"),
         property<Container<FG::FrameGrabberFactoryDef>>::create("CaptureDevices",

@@ -57,6 +57,24 @@ Cmp::Strategy Resources::cmpStrategy() const {
     });
 }
 
+Cmp::Portrait::Analyzer Resources::portraitAnalyzer() const {
+    return *portraitAnalyzer_.get(mutex_, FNTrans("Portrait Analyzer"), [&] {
+        return new Cmp::Portrait::Analyzer(rootComponent_.subComponent("PortraitAnalyzer"));
+    });
+}
+
+Kx::ISO_19794_5::FullFrontal::Test Resources::fullFrontalTest() const {
+    return *fullFrontalTest_.get(mutex_, "ISO 19794-5 Full Frontal images assessment", [&] {
+        return new Kx::ISO_19794_5::FullFrontal::Test(rootComponent_.subComponent("ISOFullFrontalTest"));
+    });
+}
+
+Kx::Feature::Test Resources::featureTest() const {
+    return *featureTest_.get(mutex_, "Feature assessment", [&] {
+        return new Kx::Feature::Test(rootComponent_.subComponent("FeatureTest"));
+    });
+}
+
 FNCountedPtr<FG::DllFrameGrabberFactoryCache> Resources::dllFrameGrabberFactoryCache() const {
     const FNMutexLock lock(mutex_);
     if (!dllFrameGrabberFactoryCache_)

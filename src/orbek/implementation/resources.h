@@ -1,5 +1,6 @@
 #pragma once
 
+#include "cmp/portrait/analyzer.h"
 #include "cmp/strategy.h"
 #include "eye/eyes_finder.h"
 #include "eye/face_finder.h"
@@ -7,6 +8,8 @@
 #include "fn/deployment/app_config_db.h"
 #include "fn/deployment/component.h"
 #include "fn/thread/mutex.h"
+#include "kx/feature_test.h"
+#include "kx/full_frontal_test.h"
 
 namespace Orbek {
 
@@ -47,6 +50,10 @@ public:
     EyesFinder eyesFinder() const;
     /// The algorithm that `AlgorithmVersion` names, with its mappings.
     Cmp::Strategy cmpStrategy() const;
+    /// Portraits: the measures, and what they tell. These read no model files yet.
+    Cmp::Portrait::Analyzer portraitAnalyzer() const;
+    Kx::ISO_19794_5::FullFrontal::Test fullFrontalTest() const;
+    Kx::Feature::Test featureTest() const;
     /// The plug-ins of capture devices.
     FNCountedPtr<FG::DllFrameGrabberFactoryCache> dllFrameGrabberFactoryCache() const;
 
@@ -58,6 +65,9 @@ private:
     MadeOnce<FaceFinder::Body> faceFinder_;
     MadeOnce<EyesFinder::Body> eyesFinder_;
     MadeOnce<Cmp::Strategy> cmpStrategy_;
+    MadeOnce<Cmp::Portrait::Analyzer> portraitAnalyzer_;
+    MadeOnce<Kx::ISO_19794_5::FullFrontal::Test> fullFrontalTest_;
+    MadeOnce<Kx::Feature::Test> featureTest_;
     mutable FNCountedPtr<FG::DllFrameGrabberFactoryCache> dllFrameGrabberFactoryCache_;
 };
 

@@ -14,6 +14,7 @@ struct ProgramRun {
     int status;
     std::string output, complaints;
 
+    /// Of results as JSON.
     std::vector<nlohmann::json> lines() const {
         std::vector<nlohmann::json> lines;
         std::istringstream stream(output);
@@ -30,4 +31,10 @@ inline ProgramRun runOrbek(const std::vector<std::string>& arguments) {
     command += " >'" + scratch.file("out") + "' 2>'" + scratch.file("err") + "'";
     const int status = std::system(command.c_str());
     return {WIFEXITED(status) ? WEXITSTATUS(status) : -1, scratch.read("out"), scratch.read("err")};
+}
+
+/// The same with results as JSON.
+inline ProgramRun runOrbekJson(std::vector<std::string> arguments) {
+    arguments.emplace_back("--json");
+    return runOrbek(arguments);
 }

@@ -28,7 +28,7 @@ TEST(OrbekToolWithModels, FindGoesOnBehindFilesThatCannotBeRead) {
     const std::string a = writeRamp(scratch, "a.pgm", 120, 90), b = writeRamp(scratch, "b.pgm", 1, 1),
                       broken = scratch.write("broken.jpg", "\xFF\xD8\xFFnothing");
     for (const char* jobs : {"1", "3"}) {
-        const ProgramRun run = runOrbek({"find", a, broken, b, "/no/such.png", a, "--jobs", jobs});
+        const ProgramRun run = runOrbekJson({"find", a, broken, b, "/no/such.png", a, "--jobs", jobs});
         EXPECT_EQ(run.status, 2);
         const auto lines = run.lines();
         ASSERT_EQ(lines.size(), 3u);
@@ -40,7 +40,10 @@ TEST(OrbekToolWithModels, FindGoesOnBehindFilesThatCannotBeRead) {
         EXPECT_NE(run.complaints.find("orbek: /no/such.png: "), std::string::npos);
         EXPECT_EQ(std::count(run.complaints.begin(), run.complaints.end(), '\n'), 2) << "no progress bar";
     }
-    EXPECT_EQ(runOrbek({"find", a, b}).status, 0);
+    const ProgramRun forPeople = runOrbek({"find", a, b});
+    EXPECT_EQ(forPeople.status, 0);
+    EXPECT_EQ(forPeople.output,
+              a + ": width 120, height 90, 0 faces\n" + b + ": width 1, height 1, 0 faces\n");
 }
 
 TEST(OrbekToolWithModels, SaysWhatStopsIt) {
@@ -89,7 +92,7 @@ TEST(OrbekToolOnPhotos, FindPrintsWhereTheFeaturesAre) {
     if (labelledPhotos().empty()) GTEST_SKIP() << "the labelled photos are not there";
     const ScratchFolder scratch;
     const std::string photo = (labelledPhotos() / "scenes/faces/celeba_001719.jpg").string();
-    const ProgramRun run = runOrbek({"find", photo, "--draw", scratch.path().string()});
+    const ProgramRun run = runOrbekJson({"find", photo, "--draw", scratch.path().string()});
     ASSERT_EQ(run.status, 0) << run.complaints;
     const nlohmann::json found = run.lines().front();
     ASSERT_EQ(found["faces"].size(), 1u);
@@ -104,9 +107,9 @@ TEST(OrbekToolOnPhotos, FindPrintsWhereTheFeaturesAre) {
     const FNImage<Fn::Bgra32> drawn = Fn::readImage(scratch.file("celeba_001719.jpg")).toBgra32();
     EXPECT_GT(drawn(172, 98).g, 150) << "a green dot on the eye";
 
-    EXPECT_TRUE(runOrbek({"find", photo, "--box", "0", "200", "300", "343"}).lines()[0]["faces"].empty());
-    EXPECT_TRUE(runOrbek({"find", photo, "--min-eye", "0.3"}).lines()[0]["faces"].empty());
-    EXPECT_TRUE(runOrbek({"find", photo, "--max-eye", "0.06"}).lines()[0]["faces"].empty());
+    EXPECT_TRUE(runOrbekJson({"find", photo, "--box", "0", "200", "300", "343"}).lines()[0]["faces"].empty());
+    EXPECT_TRUE(runOrbekJson({"find", photo, "--min-eye", "0.3"}).lines()[0]["faces"].empty());
+    EXPECT_TRUE(runOrbekJson({"find", photo, "--max-eye", "0.06"}).lines()[0]["faces"].empty());
 }
 
 TEST(OrbekToolOnPhotos, TrackGivesAFaceOneIdThroughTheFrames) {
@@ -117,8 +120,8 @@ TEST(OrbekToolOnPhotos, TrackGivesAFaceOneIdThroughTheFrames) {
     const std::string config =
         scratch.write("c.conf", "ORBEK.Substitutions.INSTALLDIR = " ORBEK_BINARY_DIR "\n"
                                 "ORBEK.FaceTracker.ReturnFacesWithNoEyesThreshold = -10\n");
-    const ProgramRun run = runOrbek({"track", scratch.path().string(), "--config", config, "--fps", "8",
-                                     "--draw", scratch.file("drawn")});
+    const ProgramRun run = runOrbekJson({"track", scratch.path().string(), "--config", config, "--fps", "8",
+                                         "--draw", scratch.file("drawn")});
     ASSERT_EQ(run.status, 0) << run.complaints;
     const auto lines = run.lines();
     ASSERT_EQ(lines.size(), 3u);

@@ -1,0 +1,80 @@
+// orbek identify: whom of a gallery pictures show.
+
+#include "command.h"
+#include "configuration_file.h"
+#include "gallery_file.h"
+#include "orbek/identification.h"
+#include "picture_lines.h"
+
+#include <memory>
+
+#include <malloc.h>
+
+namespace Orbek::Tool {
+namespace {
+
+enum IdentifyStatus : int { found = 0, nobody = 1, undecided = 2 };
+
+struct IdentifyOptions : CommonOptions {
+    std::string gallery;
+    std::vector<std::string> images;
+    unsigned int top = 10;
+    float far = 0.001f;
+    unsigned int jobs = 0;
+};
+
+class Identified final : public PictureLines<Identification::FeedbackBody> {
+public:
+    Identified(Output& output, std::list<Match>& matches) : PictureLines(output), matches_(matches) {}
+    void matches(const std::list<Match>& matches) override { matches_ = matches; }
+
+private:
+    std::list<Match>& matches_;
+};
+
+int identify(const IdentifyOptions& options) {
+    const std::vector<std::filesystem::path> files = pictureFiles(options.images);
+    const GalleryFile gallery(options.gallery);
+    Configuration configuration = openConfiguration(options.configuration);
+    configuration.setValue("ORBEK.ComparisonAlgorithm.NumberOfThreads", std::to_string(options.jobs));
+    (void)mallopt(M_TOP_PAD, 64 << 20); // records are many: the heaps grow by large steps
+    // It goes with the process, which is faster than taking it apart.
+    static const Population& population = *new Population(gallery.load(configuration, options.jobs));
+    const Score threshold = ScoreMappings(configuration).requestFAR(options.far);
+    const Identification::Processor processor(configuration, population);
+    Output output(options, files.size());
+    const std::list<Sample> samples = samplesOf(files);
+    std::list<Match> matches;
+    processor.process(samples.begin(), samples.end(), threshold,
+                      Identification::Feedback(new Identified(output, matches)), options.top);
+    nlohmann::ordered_json list = nlohmann::ordered_json::array();
+    for (const Match& match : matches)
+        list.push_back({{"id", match.name}, {"score", rounded(match.score, 6)}});
+    output.result({{"threshold", rounded(threshold, 6)}, {"matches", list}});
+    return !matches.empty() ? found : output.complained() ? undecided : nobody;
+}
+
+} // namespace
+
+Command identifyCommand(CLI::App& program) {
+    const auto options = std::make_shared<IdentifyOptions>();
+    CLI::App* const app = addCommand(
+        program, "identify",
+        "Tell whom of a gallery pictures show.\n"
+        "Tells of each picture up to the first that shows somebody, and at last of the matches, best first.\n"
+        "Exit status: 0 somebody was found, 1 nobody, 2 something went wrong.",
+        *options);
+    app->add_option("gallery", options->gallery, "File of the gallery")->required()->type_name("FILE");
+    addImages(*app, options->images);
+    app->add_option("--top", options->top, "Matches to list at most")
+        ->check(CLI::Range(1u, 1000000u))
+        ->capture_default_str();
+    app->add_option("--far", options->far,
+                    "Share of other people's records that may be taken for the person's")
+        ->check(CLI::Range(0.0f, 1.0f))
+        ->capture_default_str();
+    addJobs(*app, options->jobs);
+    return {app, [options] { return identify(*options); }, undecided};
+}
+
+} // namespace Orbek::Tool

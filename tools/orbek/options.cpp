@@ -1,0 +1,37 @@
+#include "options.h"
+
+#include <algorithm>
+#include <thread>
+
+#include <CLI/CLI.hpp>
+
+namespace Orbek::Tool {
+
+CLI::App* addCommand(CLI::App& parent, const std::string& name, const std::string& description,
+                     CommonOptions& options) {
+    CLI::App* const command = parent.add_subcommand(name, description);
+    command->add_option("--config", options.configuration, "Configuration file in place of the installed one")
+        ->type_name("FILE");
+    command->add_flag("--json", options.json, "Print results as JSON, one object a line");
+    command->add_flag("--quiet", options.quiet, "Show no progress bar");
+    return command;
+}
+
+CLI::App* addGroup(CLI::App& program, const std::string& name, const std::string& description) {
+    CLI::App* const group = program.add_subcommand(name, description);
+    group->require_subcommand(1);
+    return group;
+}
+
+void addImages(CLI::App& command, std::vector<std::string>& images, const std::string& description) {
+    command.add_option("images", images, description)->required()->type_name("IMAGE");
+}
+
+void addJobs(CLI::App& command, unsigned int& jobs) {
+    jobs = std::clamp(std::thread::hardware_concurrency(), 1u, 1024u);
+    command.add_option("--jobs", jobs, "Threads that share the work; one for each processor otherwise")
+        ->type_name("N")
+        ->check(CLI::Range(1u, 1024u));
+}
+
+} // namespace Orbek::Tool
