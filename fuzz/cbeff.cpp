@@ -1,7 +1,8 @@
-// Facial records: what is accepted has images within the limits and a place for each face, and can be written.
+// Facial records: what is accepted has images within the limits and a place for each face, and can be
+// written.
 
-#include "fn/message/dialog.h"
 #include "kx/cbeff.h"
+#include "fn/message/dialog.h"
 
 #include <cstdlib>
 #include <sstream>

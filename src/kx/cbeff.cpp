@@ -19,7 +19,7 @@ constexpr std::array<unsigned char, 8> identifierAndVersion{'F', 'A', 'C', 0, '0
 constexpr std::size_t cbeffHeaderSize = 4, recordHeaderSize = 16, facialInformationSize = 20,
                       featurePointSize = 8, imageInformationSize = 12;
 
-/// Types of face images: basic, full frontal, another one, token frontal, and one more.
+/// Types of face images. All but token images tell where the eyes are.
 constexpr unsigned char tokenFrontal = 3, lastType = 4;
 
 constexpr unsigned char pointType = 1;
@@ -120,8 +120,10 @@ Cmp::Face readFace(std::istream& stream, const Fn::ImageLimits& limits) {
 
     const std::uint32_t headers = static_cast<std::uint32_t>(facialInformationSize + imageInformationSize) +
                                   static_cast<std::uint32_t>(featurePointSize) * points;
-    const auto size = blockLength > headers ? std::optional(blockLength - headers) : std::nullopt;
-    return Cmp::Face(readImageData(stream, size, limits), location);
+    const bool credible = blockLength > headers && blockLength - headers <= limits.maxBytes;
+    return Cmp::Face(
+        readImageData(stream, credible ? std::optional(blockLength - headers) : std::nullopt, limits),
+        location);
 }
 
 } // namespace

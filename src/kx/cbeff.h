@@ -11,7 +11,7 @@
 ///
 ///     CBEFF header, 4 bytes: format owner (2), format type (2)
 ///     facial record header, 16 bytes: "FAC" NUL, "010" NUL, length of all that follows with this header (4),
-///         number of images (2), reserved (2)
+///         number of images (2), reserved (2; the standard's own table ends before it)
 ///     for each image:
 ///         facial information, 20 bytes: length of the image's block (4), number of feature points (2), what
 ///             is told of the person (14)

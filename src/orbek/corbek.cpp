@@ -11,6 +11,7 @@
 #include "orbek/population.h"
 #include "orbek/token_face_creator.h"
 
+#include <cstddef>
 #include <cstdio>
 #include <cstring>
 #include <iostream>
@@ -19,6 +20,10 @@
 using namespace Orbek;
 
 namespace {
+
+// What callers in other languages rely on.
+static_assert(sizeof(orbekMatch) == 132 && offsetof(orbekMatch, score) == 128);
+static_assert(sizeof(orbekPortraitResult) == 8 && offsetof(orbekPortraitResult, value) == 4);
 
 /// Codes of orbekGenerateFIR(), orbekFindEyes() and the functions of token faces beside 0; all others return
 /// 1 for a failure.

@@ -194,22 +194,25 @@ TEST(AreaAverages, OfColoursAreThoseOfTheirChannels) {
     } cases[] = {{sourceAlignedFractionalAveraging, Plain::sourceAligned, true},
                  {integerAveraging, Plain::integerAverage, true},
                  {bilinearInterpolationFixedpoint, Plain::bilinearBox, false}};
-    for (const auto& c : cases) {
-        Color dst(13, 11);
-        c.color(src, dst, box);
-        for (const auto channel : {&Fn::Bgra32::r, &Fn::Bgra32::g, &Fn::Bgra32::b}) {
-            Words plane(src.w(), src.h());
-            for (std::uint64_t i = 0; i < src.size(); ++i) {
-                const unsigned short v = src.data()[i].*channel;
-                plane.getExclusive()[i] = static_cast<unsigned short>(c.widens ? v << 8 | 128 : v);
-            }
-            const Words expected = c.plain(plane, box, 13, 11);
-            for (std::uint64_t i = 0; i < dst.size(); ++i) {
-                ASSERT_EQ(dst.data()[i].*channel, c.widens ? expected.data()[i] >> 8 : expected.data()[i]);
-                ASSERT_EQ(dst.data()[i].a, 255);
+    forEachTarget([&] {
+        for (const auto& c : cases) {
+            Color dst(13, 11);
+            c.color(src, dst, box);
+            for (const auto channel : {&Fn::Bgra32::r, &Fn::Bgra32::g, &Fn::Bgra32::b}) {
+                Words plane(src.w(), src.h());
+                for (std::uint64_t i = 0; i < src.size(); ++i) {
+                    const unsigned short v = src.data()[i].*channel;
+                    plane.getExclusive()[i] = static_cast<unsigned short>(c.widens ? v << 8 | 128 : v);
+                }
+                const Words expected = c.plain(plane, box, 13, 11);
+                for (std::uint64_t i = 0; i < dst.size(); ++i) {
+                    ASSERT_EQ(dst.data()[i].*channel,
+                              c.widens ? expected.data()[i] >> 8 : expected.data()[i]);
+                    ASSERT_EQ(dst.data()[i].a, 255);
+                }
             }
         }
-    }
+    });
 }
 
 TEST(FourToThree, EqualsItsPlainForm) {

@@ -107,3 +107,8 @@ check("${output}" "${found}")
 # The program finds its configuration by itself.
 run(output ${sdk}/bin/orbek find --json ${picture})
 check("${output}" "${expected_json}")
+run(output ${sdk}/bin/orbek models check)
+check("${output}" "bad 0")
+if(NOT EXISTS ${sdk}/share/man/man1/orbek-enrol.1)
+    message(FATAL_ERROR "the manual pages are not installed")
+endif()

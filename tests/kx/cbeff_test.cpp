@@ -37,8 +37,8 @@ std::list<Cmp::Face> readBack(const std::string& bytes, const Fn::ImageLimits& l
     return Kx::CBEFF::read(stream, limits);
 }
 
-/// What a record says, taken apart by the tables of the standard alone (clauses 5.3 to 5.8), each field by
-/// its place.
+/// What a record says, taken apart by the tables of the standard (clauses 5.3 to 5.8) and the two reserved
+/// bytes that follow its record header, each field by its place.
 struct Parsed {
     struct Image {
         std::size_t blockLength, points;

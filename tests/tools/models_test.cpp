@@ -1,6 +1,6 @@
 #include "model_build.h"
-#include "model_sums.h"
 #include "model_files.h"
+#include "model_sums.h"
 
 #include "support/thrown_text.h"
 

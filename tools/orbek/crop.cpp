@@ -11,6 +11,7 @@
 #include "whole_file.h"
 
 #include <algorithm>
+#include <cctype>
 #include <functional>
 #include <memory>
 #include <sstream>

@@ -7,6 +7,7 @@
 #include "gallery_import.h"
 #include "record_file.h"
 
+#include <algorithm>
 #include <memory>
 
 namespace Orbek::Tool {

@@ -6,9 +6,13 @@
 #include "parallel.h"
 #include "record_file.h"
 
+#include <algorithm>
 #include <atomic>
+#include <condition_variable>
 #include <mutex>
 #include <numeric>
+#include <thread>
+#include <utility>
 
 namespace Orbek::Tool {
 namespace {
@@ -16,39 +20,74 @@ namespace {
 using Json = nlohmann::ordered_json;
 namespace fs = std::filesystem;
 
-/// Stores entries that several threads bring: one of them writes what has come together meanwhile.
+/// Stores entries that several threads bring, on a thread of its own: what has come together is one change of
+/// the gallery, and those who enrol do not wait for the disk.
 class EntryWriter {
 public:
     EntryWriter(GalleryFile& gallery, GalleryFile::Present present, const FIRBuilder& builder, Output& output)
-        : gallery_(gallery), present_(present), builder_(builder), output_(output) {}
+        : gallery_(gallery), present_(present), builder_(builder), output_(output),
+          thread_([this] { run(); }) {}
+    ~EntryWriter() { close(); }
+    EntryWriter(const EntryWriter&) = delete;
+    EntryWriter& operator=(const EntryWriter&) = delete;
 
-    /// @param told when the entry is stored
+    /// @param told when the entry is stored. @throws what has stopped the writing
     void add(const GalleryFile::Entry& entry, const Json& told) {
-        std::unique_lock lock(mutex_);
+        const std::lock_guard lock(mutex_);
+        if (failure_) std::rethrow_exception(failure_);
         entries_.push_back(entry);
         results_.push_back(told);
-        if (writing_) return;
-        writing_ = true;
-        while (!entries_.empty()) {
-            const std::vector<GalleryFile::Entry> entries = std::exchange(entries_, {});
-            const std::vector<Json> results = std::exchange(results_, {});
-            lock.unlock();
-            (void)gallery_.add(entries, present_, builder_);
-            for (const Json& result : results) output_.result(result);
-            lock.lock();
-        }
-        writing_ = false;
+        changed_.notify_one();
+    }
+    /// Waits until all is stored.
+    /// @return how many were not, since other processes had been faster. @throws what has stopped the writing
+    std::size_t finish() {
+        close();
+        if (failure_) std::rethrow_exception(failure_);
+        return kept_;
     }
 
 private:
-    GalleryFile& gallery_; ///< used by the thread that has set writing_
+    void run() {
+        try {
+            std::unique_lock lock(mutex_);
+            while (changed_.wait(lock, [this] { return closed_ || !entries_.empty(); }), !entries_.empty()) {
+                const std::vector<GalleryFile::Entry> entries = std::exchange(entries_, {});
+                const std::vector<Json> results = std::exchange(results_, {});
+                lock.unlock();
+                const std::vector<std::string> kept = gallery_.add(entries, present_, builder_);
+                for (const Json& result : results)
+                    if (std::ranges::find(kept, result["id"].get<std::string>()) == kept.end())
+                        output_.result(result);
+                lock.lock();
+                kept_ += kept.size();
+            }
+        } catch (...) {
+            const std::lock_guard lock(mutex_);
+            failure_ = std::current_exception();
+        }
+    }
+    void close() {
+        {
+            const std::lock_guard lock(mutex_);
+            closed_ = true;
+            changed_.notify_one();
+        }
+        if (thread_.joinable()) thread_.join();
+    }
+
+    GalleryFile& gallery_; ///< used by the thread alone
     const GalleryFile::Present present_;
     const FIRBuilder& builder_;
     Output& output_;
-    std::mutex mutex_; ///< guards the rest
-    bool writing_ = false;
+    std::mutex mutex_; ///< guards what the threads share
+    std::condition_variable changed_;
     std::vector<GalleryFile::Entry> entries_;
     std::vector<Json> results_;
+    std::size_t kept_ = 0;
+    bool closed_ = false;
+    std::exception_ptr failure_;
+    std::thread thread_; // last: it uses the rest
 };
 
 } // namespace
@@ -71,7 +110,8 @@ int importFolders(const ImportOptions& options) {
     const Configuration configuration = openConfiguration(options.configuration);
     const FIRBuilder builder(configuration);
     std::vector<Enrollment::Processor> processors;
-    for (unsigned int i = 0; i < options.jobs; ++i) processors.emplace_back(configuration);
+    for (std::size_t i = 0; i < std::min<std::size_t>(options.jobs, people.size()); ++i)
+        processors.emplace_back(configuration);
 
     Output output(options, std::accumulate(people.begin(), people.end(), std::size_t{0},
                                            [](std::size_t sum, const auto& folder) {
@@ -103,8 +143,9 @@ int importFolders(const ImportOptions& options) {
                                           {"features", numberOfFeatures(*record)}});
         ++enrolled;
     });
-    output.result({{"enrolled", enrolled.load()},
-                   {"present", all - people.size()},
+    const std::size_t kept = writer.finish();
+    output.result({{"enrolled", enrolled - kept},
+                   {"present", all - people.size() + kept},
                    {"failed", people.size() - enrolled}});
     return output.complained() ? unreadable : done;
 }

@@ -8,6 +8,8 @@
 
 #include <memory>
 
+#include <malloc.h>
+
 namespace Orbek::Tool {
 namespace {
 
@@ -35,6 +37,7 @@ int identify(const IdentifyOptions& options) {
     const GalleryFile gallery(options.gallery);
     Configuration configuration = openConfiguration(options.configuration);
     configuration.setValue("ORBEK.ComparisonAlgorithm.NumberOfThreads", std::to_string(options.jobs));
+    (void)mallopt(M_TOP_PAD, 64 << 20); // records are many: the heaps grow by large steps
     // It goes with the process, which is faster than taking it apart.
     static const Population& population = *new Population(gallery.load(configuration, options.jobs));
     const Score threshold = ScoreMappings(configuration).requestFAR(options.far);

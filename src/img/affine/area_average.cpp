@@ -224,22 +224,21 @@ void averageByDivision(const FNImage<float>& src, const AreaGrid& grid, FNImage<
 }
 
 void averageByDivision(const FNImage<Fn::Bgra32>& src, const AreaGrid& grid, FNImage<Fn::Bgra32>& dst) {
-    using Channel = unsigned char Fn::Bgra32::*;
-    FNImage<unsigned short> plane(grid.box.width(), grid.box.height()), result(dst.w(), dst.h());
-    const AreaGrid planeGrid{plane.box(), grid.x, grid.y};
-    Fn::Bgra32* const out = dst.getExclusive();
-    for (const Channel channel :
-         {Channel(&Fn::Bgra32::b), Channel(&Fn::Bgra32::g), Channel(&Fn::Bgra32::r)}) {
-        unsigned short* to = plane.getExclusive();
-        for (FNConstImIter<Fn::Bgra32> it(src, grid.box); !it.atEnd(); it.nextRow())
-            to = std::ranges::transform(it.restOfRow(), to, [channel](const Fn::Bgra32& pixel) {
-                     return static_cast<unsigned short>(pixel.*channel << 8 | 128);
-                 }).out;
-        averageByDivision(plane, planeGrid, result);
-        for (std::uint64_t i = 0; i < result.size(); ++i)
-            out[i].*channel = static_cast<unsigned char>(result.data()[i] >> 8);
+    std::array<FNImage<unsigned short>, 3> planes, results;
+    std::array<unsigned short*, 3> to;
+    for (std::size_t c = 0; c < planes.size(); ++c) {
+        planes[c] = FNImage<unsigned short>(grid.box.width(), grid.box.height());
+        results[c] = FNImage<unsigned short>(dst.w(), dst.h());
+        to[c] = planes[c].getExclusive();
     }
-    for (std::uint64_t i = 0; i < dst.size(); ++i) out[i].a = 255;
+    for (FNConstImIter<Fn::Bgra32> it(src, grid.box); !it.atEnd(); it.nextRow()) {
+        Kernels::splitColor(it.restOfRow().data(), to, it.width());
+        for (unsigned short*& plane : to) plane += it.width();
+    }
+    const AreaGrid planeGrid{planes[0].box(), grid.x, grid.y};
+    for (std::size_t c = 0; c < planes.size(); ++c) averageByDivision(planes[c], planeGrid, results[c]);
+    Kernels::joinColor({results[0].data(), results[1].data(), results[2].data()}, dst.getExclusive(),
+                       dst.size());
 }
 
 } // namespace Img::Affine

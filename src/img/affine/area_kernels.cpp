@@ -151,6 +151,45 @@ void multiplyWords(const std::uint32_t* sums, const std::uint32_t* reciprocals, 
         });
 }
 
+void splitPixels(const Fn::Bgra32* pixels, const std::array<std::uint16_t*, 3>& planes, std::size_t n) {
+    const hn::ScalableTag<std::uint16_t> d;
+    const hn::Rebind<std::uint8_t, decltype(d)> bytes;
+    const std::size_t lanes = hn::Lanes(d);
+    const auto store = [&](auto channel, std::uint16_t* out) {
+        hn::StoreU(hn::Or(hn::ShiftLeft<8>(hn::PromoteTo(d, channel)), hn::Set(d, 128)), d, out);
+    };
+    std::size_t i = 0;
+    for (; i + lanes <= n; i += lanes) {
+        hn::Vec<decltype(bytes)> b, g, r, a;
+        hn::LoadInterleaved4(bytes, reinterpret_cast<const std::uint8_t*>(pixels + i), b, g, r, a);
+        store(b, planes[0] + i);
+        store(g, planes[1] + i);
+        store(r, planes[2] + i);
+    }
+    const auto wide = [](unsigned char v) { return static_cast<std::uint16_t>(v << 8 | 128); };
+    for (; i < n; ++i) {
+        planes[0][i] = wide(pixels[i].b);
+        planes[1][i] = wide(pixels[i].g);
+        planes[2][i] = wide(pixels[i].r);
+    }
+}
+
+void joinPixels(const std::array<const std::uint16_t*, 3>& planes, Fn::Bgra32* pixels, std::size_t n) {
+    const hn::ScalableTag<std::uint16_t> d;
+    const hn::RebindToSigned<decltype(d)> words;
+    const hn::Rebind<std::uint8_t, decltype(d)> bytes;
+    const std::size_t lanes = hn::Lanes(d);
+    const auto load = [&](const std::uint16_t* plane) {
+        return hn::DemoteTo(bytes, hn::BitCast(words, hn::ShiftRight<8>(hn::LoadU(d, plane))));
+    };
+    std::size_t i = 0;
+    for (; i + lanes <= n; i += lanes)
+        hn::StoreInterleaved4(load(planes[0] + i), load(planes[1] + i), load(planes[2] + i),
+                              hn::Set(bytes, 255), bytes, reinterpret_cast<std::uint8_t*>(pixels + i));
+    const auto high = [&](const std::uint16_t* plane) { return static_cast<unsigned char>(plane[i] >> 8); };
+    for (; i < n; ++i) pixels[i] = {high(planes[2]), high(planes[1]), high(planes[0])};
+}
+
 } // namespace
 } // namespace Img::Affine::Kernels::HWY_NAMESPACE
 HWY_AFTER_NAMESPACE();
@@ -165,6 +204,8 @@ HWY_EXPORT(combineF32);
 HWY_EXPORT(narrowSums);
 HWY_EXPORT(shiftWords);
 HWY_EXPORT(multiplyWords);
+HWY_EXPORT(splitPixels);
+HWY_EXPORT(joinPixels);
 } // namespace
 
 void combineRows(std::span<const std::uint16_t* const> rows, const std::uint32_t* weights, std::uint32_t* out,
@@ -188,6 +229,12 @@ void multiplyHigh(const std::uint32_t* sums, const std::uint32_t* reciprocals, s
 }
 void multiply(const float* sums, const float* factors, float* out, std::size_t n) {
     for (std::size_t i = 0; i < n; ++i) out[i] = sums[i] * factors[i];
+}
+void splitColor(const Fn::Bgra32* pixels, const std::array<std::uint16_t*, 3>& planes, std::size_t n) {
+    HWY_DYNAMIC_DISPATCH(splitPixels)(pixels, planes, n);
+}
+void joinColor(const std::array<const std::uint16_t*, 3>& planes, Fn::Bgra32* pixels, std::size_t n) {
+    HWY_DYNAMIC_DISPATCH(joinPixels)(planes, pixels, n);
 }
 
 bool NarrowWindows::suits(const Overlap& overlap) {

@@ -1,7 +1,9 @@
 #pragma once
 
+#include "fn/image.h"
 #include "img/affine/overlap.h"
 
+#include <array>
 #include <cstddef>
 #include <cstdint>
 #include <span>
@@ -66,5 +68,10 @@ void multiplyHigh(const std::uint32_t* sums, const std::uint32_t* reciprocals, s
 
 /// out[i] = sums[i] * factors[i].
 void multiply(const float* sums, const float* factors, float* out, std::size_t n);
+
+/// Planes of blue, green and red as 16-bit pixels: (v << 8) | 128.
+void splitColor(const Fn::Bgra32* pixels, const std::array<std::uint16_t*, 3>& planes, std::size_t n);
+/// Opaque pixels of the high bytes of three such planes.
+void joinColor(const std::array<const std::uint16_t*, 3>& planes, Fn::Bgra32* pixels, std::size_t n);
 
 } // namespace Img::Affine::Kernels

@@ -157,6 +157,10 @@ TEST_F(GalleryToolWithModels, SeveralProcessesWriteAndReadAtOnce) {
     Ids all = people;
     for (const std::string& id : people) all.insert("again/" + id);
     EXPECT_EQ(ids(gallery), all);
+    std::size_t enrolled = 0;
+    for (const ProgramRun& run : {runs[0], runs[1], runs[2]})
+        enrolled += run.lines().back()["enrolled"].get<std::size_t>();
+    EXPECT_EQ(enrolled, all.size()) << "each by one of the processes";
 }
 
 TEST_F(GalleryToolWithModels, FilesThatAreNoGalleriesAreNamed) {

@@ -34,7 +34,7 @@ TEST(OrbekSettingsWithModels, AreToldAndChanged) {
     EXPECT_EQ(run({"list", "ORBEK.FaceTracker"}).output.find("ORBEK.FaceFinder."), std::string::npos);
     for (const auto& [arguments, complaint] :
          {std::pair{std::vector<std::string>{"get", "ORBEK.FaceTracke"},
-                    "orbek: ORBEK.FaceTracke: is no key"},
+                    std::string("orbek: ORBEK.FaceTracke: is no key")},
           {{"list", "ORBEK.FaceTracke"}, "orbek: ORBEK.FaceTracke: is no key"},
           {{"set", "ORBEK.FaceTracker", "1"}, "orbek: ORBEK.FaceTracker: is a group"},
           {{"set", key, "fast"}, "orbek: " + key + ": \"fast\" is not of the type Float"}}) {
