@@ -68,8 +68,9 @@ std::vector<PictureTree::Folder> peopleIn(const std::string& photos, Output& out
 Demonstration plan(std::vector<PictureTree::Folder> people, float far) {
     Demonstration plan;
     plan.far = far;
+    std::optional<PictureTree::Folder> stranger;
     if (people.size() >= enoughForStranger) {
-        plan.probes.push_back({people.back().name, {people.back().pictures.front(), {}}, {}, {}, {}});
+        stranger = people.back();
         people.pop_back();
     }
     for (auto& [name, pictures] : people) {
@@ -80,6 +81,7 @@ Demonstration plan(std::vector<PictureTree::Folder> people, float far) {
         plan.people.push_back({name, {}, false});
         for (const fs::path& picture : pictures) plan.people.back().pictures.push_back({picture, {}});
     }
+    if (stranger) plan.probes.push_back({stranger->name, {stranger->pictures.front(), {}}, {}, {}, {}});
     return plan;
 }
 
@@ -99,11 +101,18 @@ std::optional<FIR> enrol(const Enrollment::Processor& processor, std::span<Demon
                          Output& output) {
     std::vector<fs::path> files;
     for (const auto& picture : pictures) files.push_back(picture.file);
-    return enrolPictures(processor, files, output, [&](const Json& told) {
+    const auto tell = [&](const Json& told) {
         const auto picture = std::ranges::find(pictures, fs::path(told.at("file").get<std::string>()),
                                                &Demonstration::Picture::file);
         picture->eyes = eyesOf(told);
-    });
+        picture->readable = true;
+    };
+    try {
+        return enrolPictures(processor, files, output, tell);
+    } catch (const std::exception& e) {
+        output.complaint(files.front().string(), e.what());
+        return {};
+    }
 }
 
 int demonstrate(const DemoOptions& options) {
@@ -113,7 +122,8 @@ int demonstrate(const DemoOptions& options) {
     const Configuration configuration = openConfiguration(options.configuration);
     const FIRBuilder builder(configuration);
     demo.threshold = ScoreMappings(configuration).requestFAR(options.far);
-    const std::vector<Enrollment::Processor> processors(options.jobs, Enrollment::Processor(configuration));
+    std::vector<Enrollment::Processor> processors;
+    for (unsigned int i = 0; i < options.jobs; ++i) processors.emplace_back(configuration);
 
     fs::create_directories(options.folder);
     const fs::path galleryName = fs::path(options.folder) / "people.gallery";
@@ -135,7 +145,10 @@ int demonstrate(const DemoOptions& options) {
         Demonstration::Person& person = demo.people[i];
         pictures += person.pictures.size();
         person.enrolled = records[i].has_value();
-        if (person.enrolled) entries.push_back(entryOf(person.name, *records[i]));
+        if (person.enrolled)
+            entries.push_back(entryOf(person.name, *records[i]));
+        else
+            output.complaint(person.name, "not enrolled, too few usable pictures");
         output.result(
             {{"id", person.name}, {"pictures", person.pictures.size()}, {"enrolled", person.enrolled}});
     }

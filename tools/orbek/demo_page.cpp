@@ -44,6 +44,7 @@ struct Drawn {
 };
 
 Drawn drawingOf(const Demonstration::Picture& picture) {
+    if (!picture.readable) return {"0 0 3 4", "<title>cannot be read</title>"};
     const FNImage<Fn::Bgra32> image = readUpright(picture.file).toBgra32();
     const double scale = std::min(1.0, thumbnailHeight / static_cast<double>(image.h()));
     const auto side = [&](std::size_t pixels) {

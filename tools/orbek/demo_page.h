@@ -16,6 +16,7 @@ struct Demonstration {
     struct Picture {
         std::filesystem::path file;
         std::optional<Eyes::Location> eyes; ///< none if they were not found
+        bool readable = false;
     };
     struct Person {
         std::string name;
@@ -43,7 +44,7 @@ struct Demonstration {
 };
 
 /// A page of HTML to look at, which needs nothing beside it. Reads the pictures once more.
-/// @throws std::exception naming a file that cannot be read any more
+/// @throws std::exception if one cannot be read any more
 std::string demonstrationPage(const Demonstration& demonstration);
 
 } // namespace Orbek::Tool
