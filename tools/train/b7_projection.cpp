@@ -2,6 +2,7 @@
 
 #include "cmp/b7/encoder.h"
 #include "cmp/b7/preprocessor.h"
+#include "fn/matrix_decomposition.h"
 #include "fn/matrix_eigen.h"
 #include "fn/matrix_product.h"
 
@@ -29,8 +30,9 @@ constexpr std::size_t mostPicturesThatCount = 10; ///< of one person, for the sc
 constexpr std::uint32_t rank = 800;               ///< of the correction to the diagonal
 constexpr double basisLevels = 6; ///< standard deviation of the weights of the basis as integers
 constexpr double mostLevel = 127, mostSquareLevel = 2047;
-/// Of raw scores of different people; see Cmp::B7::b7NormParams.
-constexpr double impostorDeviation = 4.04;
+/// Root mean square of components as a share of the magnitude that records keep. What is beyond is cut, which
+/// makes scores better: a few large components would weigh too much.
+constexpr double spreadInRecords = 0.65;
 
 float valueOf(std::uint8_t digit) {
     return static_cast<float>(digit) * (Cmp::B7::PreProcessor::rankTable.front() / 255);
@@ -111,42 +113,14 @@ std::vector<float> averageOf(const RawVectors& raw, const std::vector<std::size_
     return average;
 }
 
-/// Fills in the basis, blockOfComponent and the scale of the basis' integers, which is returned.
-double learnBasis(const RawVectors& raw, const std::vector<std::size_t>& samples, std::size_t components,
-                  B7Factors& factors) {
-    struct Direction {
-        float variance;
-        std::size_t block, column;
-    };
-    const auto rows = factors.rowsOfBlocks();
-    std::vector<Direction> directions;
-    std::vector<Matrix<float>> vectors;
-    for (std::size_t block = 0; block < rows.size(); ++block) {
-        const std::size_t n = rows[block].size();
-        Scatter scatter(n);
-        for (const std::size_t s : samples) {
-            float* const column = scatter.next();
-            for (std::size_t i = 0; i < n; ++i)
-                column[i] = valueOf(raw.vector(s)[rows[block][i]]) - factors.average[rows[block][i]];
-        }
-        SymmMatrix<float> covariance = scatter.sum();
-        vectors.emplace_back(n, n);
-        const FNVector<float> values = Fn::eigenVectorsLowMem(covariance, vectors.back(), true);
-        for (std::size_t i = 0; i < n; ++i) directions.push_back({values.get()[i], block, i});
-    }
-    std::ranges::stable_sort(directions, std::ranges::greater(), &Direction::variance);
-    directions.resize(components);
-    std::ranges::stable_sort(directions, {}, &Direction::block);
-    const double scale = basisLevels * std::sqrt(static_cast<double>(rows.front().size()));
-    for (const Direction& d : directions) {
-        factors.blockOfComponent.push_back(static_cast<std::uint8_t>(d.block));
-        const std::size_t n = rows[d.block].size();
-        const float* const vector = vectors[d.block].get() + d.column * n;
-        for (std::size_t i = 0; i < n; ++i)
-            factors.basis.push_back(static_cast<std::int8_t>(
-                std::clamp<double>(std::round(vector[i] * scale), -mostLevel, mostLevel)));
-    }
-    return scale;
+/// The ranks of some rows, less their averages, one column for each sample.
+Matrix<float> rowsOf(const RawVectors& raw, std::span<const std::size_t> samples,
+                     const std::vector<std::uint32_t>& rows, const B7Factors& factors) {
+    Matrix<float> result(rows.size(), samples.size());
+    float* out = result.getExclusive();
+    for (const std::size_t s : samples)
+        for (const std::uint32_t r : rows) *out++ = valueOf(raw.vector(s)[r]) - factors.average[r];
+    return result;
 }
 
 /// Inner components of samples, one column for each.
@@ -162,12 +136,8 @@ Matrix<float> innerComponents(const RawVectors& raw, const std::vector<std::size
     for (std::size_t begin = 0; begin < samples.size(); begin += batch) {
         const std::size_t count = std::min(batch, samples.size() - begin);
         for (const B7Factors::Block& block : blocks) {
-            Matrix<float> part(block.rows.size(), count);
-            float* out = part.getExclusive();
-            for (std::size_t s = begin; s < begin + count; ++s)
-                for (const std::uint32_t r : block.rows)
-                    *out++ = valueOf(raw.vector(samples[s])[r]) - factors.average[r];
-            const Matrix<float> inner = block.basis.transposedMultWith(part);
+            const Matrix<float> inner = block.basis.transposedMultWith(
+                rowsOf(raw, std::span(samples).subspan(begin, count), block.rows, factors));
             for (std::size_t s = 0; s < count; ++s)
                 std::copy_n(inner.get() + s * inner.rows(), inner.rows(),
                             result.getExclusive() + (begin + s) * result.rows() + block.first);
@@ -265,6 +235,64 @@ SymmMatrix<float> betweenPersons(const Matrix<float>& inner, const Groups& pictu
     return products.sum() - squares.sum();
 }
 
+/// Statistics of samples of named people.
+struct Scatters {
+    SymmMatrix<float> within, between;
+    float meanVariance; ///< within persons
+
+    /// @param columns of the samples @param named the samples
+    Scatters(const Matrix<float>& columns, const RawVectors& raw, const std::vector<std::size_t>& named)
+        : within(withinPersons(columns, groupsBy(raw, named, &RawVectors::Item::person))),
+          between(columns.rows()), meanVariance(0) {
+        for (std::size_t i = 0; i < within.size(); ++i)
+            meanVariance += std::as_const(within)(i, i) / static_cast<float>(within.size());
+        addSets(columns, setsOf(raw, named), within);
+        std::map<std::string, std::string> personOfPicture;
+        for (const std::size_t s : named) personOfPicture[raw.item(s).file] = raw.item(s).person;
+        between = betweenPersons(columns, groupsBy(raw, named, &RawVectors::Item::file), personOfPicture);
+    }
+};
+
+/// Fills in the basis, blockOfComponent and the scale of the basis' integers, which is returned. The basis of
+/// each region spans the directions in which persons differ most in proportion to the differences of one
+/// person's pictures; all regions compete for the components.
+double learnBasis(const RawVectors& raw, const std::vector<std::size_t>& named, std::size_t components,
+                  B7Factors& factors) {
+    struct Direction {
+        float ratio;
+        std::size_t block, column;
+    };
+    const auto rows = factors.rowsOfBlocks();
+    std::vector<Direction> directions;
+    std::vector<Matrix<float>> bases;
+    for (std::size_t block = 0; block < rows.size(); ++block) {
+        const std::size_t n = rows[block].size();
+        Scatters scatters(rowsOf(raw, named, rows[block], factors), raw, named);
+        scatters.within += FNVector<float>(std::vector<float>(n, shrinkage * scatters.meanVariance));
+        Matrix<float> ascending(n, n), descending(n, n);
+        const FNVector<float> ratios =
+            Fn::generalizedEigenVectorsLowMem(scatters.between, scatters.within, ascending, true);
+        for (std::size_t i = 0; i < n; ++i) {
+            std::copy_n(ascending.get() + (n - 1 - i) * n, n, descending.getExclusive() + i * n);
+            directions.push_back({ratios.get()[n - 1 - i], block, i});
+        }
+        bases.push_back(Fn::MKL::QR(descending).Q);
+    }
+    std::ranges::stable_sort(directions, std::ranges::greater(), &Direction::ratio);
+    directions.resize(components);
+    std::ranges::stable_sort(directions, {}, &Direction::block);
+    const double scale = basisLevels * std::sqrt(static_cast<double>(rows.front().size()));
+    for (const Direction& d : directions) {
+        factors.blockOfComponent.push_back(static_cast<std::uint8_t>(d.block));
+        const std::size_t n = rows[d.block].size();
+        const float* const vector = bases[d.block].get() + d.column * n;
+        for (std::size_t i = 0; i < n; ++i)
+            factors.basis.push_back(static_cast<std::int8_t>(
+                std::clamp<double>(std::round(vector[i] * scale), -mostLevel, mostLevel)));
+    }
+    return scale;
+}
+
 /// Multiplies each column by its factor.
 void scaleColumns(Matrix<float>& m, const std::vector<float>& factors) {
     float* v = m.getExclusive();
@@ -360,34 +388,27 @@ void compress(const Matrix<float>& square, const std::vector<float>& variances, 
 
 /// Orders components by variance, from features of some pictures as they will be.
 /// @param integers square matrix in the present order @return what features are to be scaled by
-double orderAndScale(const RawVectors& raw, const std::vector<std::size_t>& named, const Matrix<float>& inner,
-                     const std::vector<float>& integers, B7Factors& factors) {
+double orderAndScale(const Matrix<float>& inner, const std::vector<float>& integers, B7Factors& factors) {
     const std::size_t components = factors.components();
     Matrix<float> square(components, components);
     for (std::size_t i = 0; i < integers.size(); ++i) square.getExclusive()[i] = integers[i] * factors.unit;
     std::mt19937 random(1);
     Matrix<float> some(components, batch);
-    std::vector<std::string> persons;
-    for (std::size_t k = 0; k < batch; ++k) {
-        const std::size_t c = random() % inner.cols();
-        std::copy_n(inner.get() + c * components, components, some.getExclusive() + k * components);
-        persons.push_back(raw.item(named[c]).person);
-    }
+    for (std::size_t k = 0; k < batch; ++k)
+        std::copy_n(inner.get() + random() % inner.cols() * components, components,
+                    some.getExclusive() + k * components);
     const Matrix<float> features = square.transposedMultWith(some);
-    std::vector<float> spread(components);
+    std::vector<float> squares(components);
     for (std::size_t k = 0; k < batch; ++k)
         for (std::size_t i = 0; i < components; ++i)
-            spread[i] += features.get()[k * components + i] * features.get()[k * components + i];
-    std::ranges::stable_sort(factors.order, std::ranges::greater(), [&](auto i) { return spread[i]; });
-    const Matrix<float> scores = features.transposedMultWith(features);
-    double squares = 0, pairs = 0;
-    for (std::size_t a = 0; a < batch; ++a)
-        for (std::size_t b = 0; b < a; ++b)
-            if (persons[a] != persons[b]) {
-                squares += scores.get()[a * batch + b] * scores.get()[a * batch + b];
-                ++pairs;
-            }
-    return std::sqrt(impostorDeviation / std::sqrt(squares / pairs));
+            squares[i] += features.get()[k * components + i] * features.get()[k * components + i] / batch;
+    std::ranges::stable_sort(factors.order, std::ranges::greater(), [&](auto i) { return squares[i]; });
+    const std::vector<float> magnitudes = Cmp::B7::Encoder().factors();
+    double shares = 0;
+    for (std::size_t i = 0; i < components; ++i)
+        shares +=
+            squares[factors.order[i]] / (magnitudes[i] * magnitudes[i]) / static_cast<double>(components);
+    return spreadInRecords / std::sqrt(shares);
 }
 
 } // namespace
@@ -403,21 +424,14 @@ B7Factors learnProjection(const RawVectors& raw) {
     B7Factors factors;
     factors.average = averageOf(raw, all);
     factors.blockOfRow = blocksOfRows();
-    const double basisScale = learnBasis(raw, all, components, factors);
+    const double basisScale = learnBasis(raw, named, components, factors);
     const Matrix<float> inner = innerComponents(raw, named, factors, basisScale);
     std::cout << "  " << inner.cols() << " samples of named people\n" << std::flush;
-
-    std::map<std::string, std::string> personOfPicture;
-    for (const std::size_t s : named) personOfPicture[raw.item(s).file] = raw.item(s).person;
-    SymmMatrix<float> within = withinPersons(inner, groupsBy(raw, named, &RawVectors::Item::person));
-    float variance = 0;
-    for (std::size_t i = 0; i < components; ++i) variance += std::as_const(within)(i, i);
-    std::cout << "  variance within persons: " << variance << '\n' << std::flush;
-    addSets(inner, setsOf(raw, named), within);
-    const SymmMatrix<float> between =
-        betweenPersons(inner, groupsBy(raw, named, &RawVectors::Item::file), personOfPicture);
-    const Matrix<float> root =
-        metricRoot(within, between, shrinkage * variance / static_cast<float>(components));
+    Matrix<float> root(components, components);
+    {
+        Scatters scatters(inner, raw, named);
+        root = metricRoot(std::move(scatters.within), scatters.between, shrinkage * scatters.meanVariance);
+    }
 
     std::vector<float> variances(components);
     for (std::size_t c = 0; c < inner.cols(); ++c)
@@ -429,7 +443,7 @@ B7Factors learnProjection(const RawVectors& raw) {
     factors.order.resize(components);
     std::iota(factors.order.begin(), factors.order.end(), std::uint16_t{0});
     const std::vector<float> integers = factors.squareMatrix();
-    const double featureScale = orderAndScale(raw, named, inner, integers, factors);
+    const double featureScale = orderAndScale(inner, integers, factors);
 
     // The largest weight of the projection becomes the largest that 8 bits hold.
     double most = 0;

@@ -44,6 +44,12 @@ Encoder::Encoder() {
     for (const Group& group : groups_) words_ += padded(group.first);
 }
 
+std::vector<float> Encoder::factors() const {
+    std::vector<float> factors;
+    for (const auto& block : blocks_) factors.insert(factors.end(), block->count(), block->factor());
+    return factors;
+}
+
 void Encoder::encode(const FloatingPointFeature& feature, unsigned char* encoded) const {
     if (feature.vector.size() != components_)
         FN_THROW(FNEBadArg, "PCLD: feature of " + std::to_string(feature.vector.size()) +

@@ -53,6 +53,8 @@ public:
     std::size_t mementoSize() const { return encodedSize_; }
 
     const std::vector<Group>& groups() const { return groups_; }
+    /// The magnitude up to which each component is told apart.
+    std::vector<float> factors() const;
 
     /// Bytes of an encoded feature before the blocks, which are what packedProducts() takes.
     static constexpr std::size_t headerSize = 3 * sizeof(float);
