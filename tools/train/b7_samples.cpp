@@ -22,7 +22,7 @@ namespace {
 using Labelled::Split;
 
 constexpr const char* peopleFolders[] = {"people/lfw", "people/celeba"};
-/// The same few people in light from all sides.
+/// The same few people in light from all sides. Labels are rough: the same for all pictures of a person.
 constexpr const char* lightFolder = "portraits/light";
 constexpr const char* unnamedFolders[] = {"portraits/fairface", "portraits/utkface", "portraits/mtfl"};
 
@@ -144,7 +144,7 @@ Extracted extract(const Extraction& extraction, const Source& source, std::uint6
     const Landmarks place = label.value_or(
         Landmarks{*source.row.position("eye_left"), *source.row.position("eye_right"), {}, {}});
     const auto both = [&](const FNImage<float>& pixels, const Landmarks& labelPlace,
-                          RawVectors::Variant plain, RawVectors::Variant moved) {
+                          RawVectors::Variant plain, RawVectors::Variant moved, RawVectors::Variant onLabel) {
         const std::optional<Landmarks> found =
             extraction.find(FNImageReferenceFactory::create(pixels), truthOf(labelPlace));
         if (!found && !label) return;
@@ -153,12 +153,13 @@ Extracted extract(const Extraction& extraction, const Source& source, std::uint6
         if (!source.named || source.split != Split::train) return;
         std::mt19937_64 random(seed ^ std::hash<std::string>()(source.file) ^ plain);
         keep(moved, pixels, jitteredLandmarks(landmarks, random), found.has_value());
+        if (found && label && !source.file.starts_with(lightFolder)) keep(onLabel, pixels, labelPlace, false);
     };
-    both(image, place, RawVectors::asFound, RawVectors::jittered);
+    both(image, place, RawVectors::asFound, RawVectors::jittered, RawVectors::labelled);
     if (source.named && source.split == Split::train)
         both(Img::Affine::vertReflection(image, image.box()),
              mirroredLandmarks(place, static_cast<float>(image.w())), RawVectors::mirrored,
-             RawVectors::mirrorJittered);
+             RawVectors::mirrorJittered, RawVectors::mirrorLabelled);
     return result;
 }
 

@@ -20,6 +20,8 @@ public:
         mirrored,       ///< the same on the mirrored picture
         jittered,       ///< landmarks of the first moved at random
         mirrorJittered, ///< landmarks of the second moved at random
+        labelled,       ///< landmarks of the labels, where our finders found them too
+        mirrorLabelled, ///< the same on the mirrored picture
         variants
     };
     struct Item {
@@ -30,11 +32,12 @@ public:
         bool found; ///< by our own finders; else the labels were used
     };
 
-    /// Raw vectors of all pictures of faces below `data`, as far as they have landmarks: four variants of
+    /// Raw vectors of all pictures of faces below `data`, as far as they have landmarks: all variants of
     /// those of named people in the train part, the first one of all others, those of unnamed people only of
-    /// the train part.
+    /// the train part. Variants teach what tells nothing about a person: places of landmarks, above all as
+    /// two ways to find them differ.
     ///
-    /// They are kept in `sources.cache` (two files, 1 GB) and read from there if they are there.
+    /// They are kept in `sources.cache` (two files, 1.3 GB) and read from there if they are there.
     explicit RawVectors(const TrainingSources& sources);
 
     std::size_t size() const { return items_.size(); }
