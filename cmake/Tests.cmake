@@ -14,6 +14,10 @@ function(orbek_test name)
     orbek_link(test_${name} ${arg_LINKS})
     target_include_directories(test_${name} PRIVATE ${CMAKE_SOURCE_DIR}/tests)
     target_link_libraries(test_${name} PRIVATE ${arg_LIBRARIES} GTest::gmock GTest::gtest_main)
+    if(ORBEK_SANITIZE)
+        # Tests take longer to build than to run.
+        target_compile_options(test_${name} PRIVATE -O0)
+    endif()
     target_compile_definitions(test_${name} PRIVATE
         ORBEK_SOURCE_DIR="${CMAKE_SOURCE_DIR}" ORBEK_BINARY_DIR="${CMAKE_BINARY_DIR}")
     set(unit "*-*WithModels.*:*OnPhotos.*")
