@@ -19,7 +19,11 @@ void run(const std::string& bytes) {
 }
 
 void runWithMutations(const std::filesystem::path& path) {
+#ifdef ORBEK_MUTATIONS
+    constexpr std::size_t mutations = ORBEK_MUTATIONS; // of a slow target
+#else
     constexpr std::size_t mutations = 200;
+#endif
     std::ifstream file(path, std::ios::binary);
     const std::string bytes{std::istreambuf_iterator<char>(file), {}};
     run(bytes);
