@@ -235,7 +235,7 @@ SymmMatrix<float> betweenPersons(const Matrix<float>& inner, const Groups& pictu
     return products.sum() - squares.sum();
 }
 
-/// Statistics of samples of named people.
+/// How samples of named people scatter within and between persons.
 struct Scatters {
     SymmMatrix<float> within, between;
     float meanVariance; ///< within persons
