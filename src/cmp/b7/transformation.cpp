@@ -2,18 +2,18 @@
 
 #include "fn/byte_order.h"
 
-#include <algorithm>
-#include <cstdlib>
+#include <cerrno>
+#include <cstring>
+#include <filesystem>
 #include <fstream>
 
+#include <fcntl.h>
 #include <sys/mman.h>
+#include <unistd.h>
 
 namespace Cmp::B7 {
 
 namespace {
-
-/// Vectors are loaded from whole multiples of so many weights.
-constexpr std::size_t rowUnit = 16;
 
 using Weights = Fn::Matrix<signed char>;
 
@@ -46,42 +46,51 @@ T readPackage(std::istream& stream, const std::string& path, const char* before,
     failInvalid(before, path, behind);
 }
 
-/// Memory in large pages, where the system has them: a projection goes over all of it, and most of the time
-/// that fresh memory takes is that of its pages.
-FNRMemCore largeBlock(std::size_t size) {
-    struct Free final : FNRMemCore::Dtor {
-        void del(void* memory) const override { std::free(memory); }
-    };
-    constexpr std::size_t largePage = std::size_t{2} << 20;
-    const std::size_t whole = (size + largePage - 1) / largePage * largePage;
-    void* const memory = std::aligned_alloc(largePage, whole);
-    if (!memory) throw std::bad_alloc();
-    madvise(memory, whole, MADV_HUGEPAGE); // without them it is slower, no more
-    return FNRMemCore(memory, size, FNCountedPtr<FNRMemCore::Dtor>(new Free));
-}
-
 std::uint32_t readCount(std::istream& stream) {
     unsigned char bytes[4] = {};
     stream.read(reinterpret_cast<char*>(bytes), sizeof bytes);
     return Fn::loadUInt32(bytes);
 }
 
-/// The package of a matrix, each column read straight to where it stays.
+/// Bytes of a file where the system has them: nothing is copied, and all processes share them. The file may
+/// be replaced meanwhile, but not be written over.
+class MappedBytes final : public FNRMemCore::Dtor {
+public:
+    /// @throws FNESysError
+    MappedBytes(const std::string& path, std::size_t offset, std::size_t size) {
+        const int file = ::open(path.c_str(), O_RDONLY | O_CLOEXEC);
+        if (file < 0) FN_THROW(FNESysError, path + ": " + std::strerror(errno));
+        const std::size_t before = offset % static_cast<std::size_t>(::sysconf(_SC_PAGESIZE));
+        length_ = before + size;
+        start_ = ::mmap(nullptr, length_, PROT_READ, MAP_SHARED, file, static_cast<off_t>(offset - before));
+        const int error = errno;
+        ::close(file);
+        if (start_ == MAP_FAILED) FN_THROW(FNESysError, path + ": " + std::strerror(error));
+        ::madvise(start_, length_, MADV_WILLNEED); // without it is slower, no more
+        bytes_ = static_cast<const unsigned char*>(start_) + before;
+    }
+    const unsigned char* bytes() const { return bytes_; }
+    void del(void*) const override { ::munmap(start_, length_); }
+
+private:
+    void* start_;
+    std::size_t length_;
+    const unsigned char* bytes_;
+};
+
+/// The package of a matrix, which stays in the file.
 /// @return an empty matrix if it is not one of so many rows, or ends early
-Weights readMatrix(std::istream& stream, std::size_t rows, std::size_t components) {
+Weights mapMatrix(std::istream& stream, const std::string& path, std::size_t rows, std::size_t components) {
     const std::uint32_t cores = readCount(stream), dimensions = readCount(stream), size = readCount(stream);
     const std::uint32_t storedRows = readCount(stream), cols = readCount(stream);
     if (!stream || cores != 2 || dimensions != 8 || storedRows != rows || size != std::uint64_t{rows} * cols)
         return Weights(0, 0);
     if (cols != components) return Weights(0, cols);
-    const std::size_t stride = (rows + rowUnit - 1) / rowUnit * rowUnit;
-    Weights result(FNRMem<signed char>(largeBlock(std::max<std::size_t>(stride * cols, 1))), stride, cols);
-    signed char* column = result.getExclusive();
-    for (std::size_t c = 0; c < cols && stream; ++c, column += stride) {
-        stream.read(reinterpret_cast<char*>(column), static_cast<std::streamsize>(rows));
-        std::fill(column + rows, column + stride, static_cast<signed char>(0));
-    }
-    return stream ? result : Weights(0, 0);
+    const auto begin = static_cast<std::size_t>(stream.tellg());
+    if (size == 0 || std::filesystem::file_size(path) < begin + size) return Weights(0, 0);
+    stream.seekg(size, std::ios::cur);
+    const FNCountedPtr<MappedBytes> file(new MappedBytes(path, begin, size));
+    return Weights(FNRMem<signed char>(FNRMemCore(file->bytes(), size, file, false)), rows, cols);
 }
 
 } // namespace
@@ -94,7 +103,7 @@ Transformation Transformation::read(const std::string& path, std::size_t rawSize
     };
     const float factor =
         readPackage<Factor>(stream, path, "float factor package reading file '", "'", 1).value;
-    const Weights matrix = readMatrix(stream, rawSize, components);
+    const Weights matrix = mapMatrix(stream, path, rawSize, components);
     if (matrix.cols() != components && matrix.cols() != 0)
         FN_THROW(FNEIOError, "PCLD: incompatible number of vector components.  Matrix cols = " +
                                  std::to_string(matrix.cols()) +
@@ -108,19 +117,19 @@ Transformation Transformation::read(const std::string& path, std::size_t rawSize
 
 void Transformation::write(std::ostream& stream) const {
     Fn::Package(factor).write(stream);
-    const Weights unpadded = matrix.rows() == average.size()
-                                 ? matrix
-                                 : Weights(matrix, 0, 0, average.size() - 1, matrix.cols() - 1);
-    static_cast<Fn::Package>(unpadded).write(stream);
+    static_cast<Fn::Package>(matrix).write(stream);
     for (const FNVector<float>& vector : {average, translation, base})
         static_cast<Fn::Package>(vector).write(stream);
 }
 
 void Transformation::write(const std::string& path) const {
-    std::ofstream stream(path, std::ios::binary);
+    const std::string unfinished = path + ".part"; // what others have mapped stays as it is
+    std::ofstream stream(unfinished, std::ios::binary);
     write(stream);
     stream.close();
-    if (!stream) FN_THROW(FNEIOError, "Cannot write the transformation '" + path + "'");
+    std::error_code error;
+    if (stream) std::filesystem::rename(unfinished, path, error);
+    if (!stream || error) FN_THROW(FNEIOError, "Cannot write the transformation '" + path + "'");
 }
 
 } // namespace Cmp::B7

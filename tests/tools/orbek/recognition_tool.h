@@ -9,14 +9,17 @@ class RecognitionToolWithModels : public B7Setup {
 protected:
     static void SetUpTestSuite() {
         B7Setup::SetUpTestSuite();
-        const auto write = [](const char* name, float first, float last, float xMax) {
+        const auto write = [](const std::string& name, float first, float last, float xMax) {
             const Fn::InvertibleFunction<float, float> mapping(FNVector<float>(std::vector{first, last}), 0,
                                                                xMax);
             Cmp::Implementation::writeMappingFile(mapping, folder().file(name));
         };
         write("smap-b7.dat", 0, 1, 4000);
-        write("farmap-b7.dat", 1, 0, 1);
-        write("frrmap-b7.dat", 0, 0.5f, 1);
+        write("smap-b7-sn.dat", 0, 1, 10); // normalized
+        for (const std::string names : {"b7.dat", "b7-sn.dat"}) {
+            write("farmap-" + names, 1, 0, 1);
+            write("frrmap-" + names, 0, 0.5f, 1);
+        }
         const std::string b7 = "ORBEK.ComparisonAlgorithm.AlgorithmVersion.B7.";
         folder().write("b7.conf",
                        "ORBEK.Substitutions.INSTALLDIR = " ORBEK_BINARY_DIR "\n" + b7 +
