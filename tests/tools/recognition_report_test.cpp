@@ -1,6 +1,6 @@
-#include "cmp/number_records.h"
 #include "cmp/score_mapping.h"
 #include "eval/recognition.h"
+#include "support/number_records.h"
 
 #include <gtest/gtest.h>
 
