@@ -2,13 +2,14 @@
 
 #include "fn/byte_order.h"
 
-#include <cerrno>
-#include <cstring>
 #include <filesystem>
 #include <fstream>
+#include <optional>
+#include <span>
 
 #include <fcntl.h>
 #include <sys/mman.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
 namespace Cmp::B7 {
@@ -52,58 +53,75 @@ std::uint32_t readCount(std::istream& stream) {
     return Fn::loadUInt32(bytes);
 }
 
-/// Bytes of a file where the system has them: nothing is copied, and all processes share them. The file may
-/// be replaced meanwhile, but not be written over.
-class MappedBytes final : public FNRMemCore::Dtor {
+/// A file where the system has it: nothing is copied, and all processes share it. It may be replaced
+/// meanwhile, but not be written over.
+class MappedFile final : public FNRMemCore::Dtor {
 public:
-    /// @throws FNESysError
-    MappedBytes(const std::string& path, std::size_t offset, std::size_t size) {
+    /// @throws FNEIOError
+    explicit MappedFile(const std::string& path) {
         const int file = ::open(path.c_str(), O_RDONLY | O_CLOEXEC);
-        if (file < 0) FN_THROW(FNESysError, path + ": " + std::strerror(errno));
-        const std::size_t before = offset % static_cast<std::size_t>(::sysconf(_SC_PAGESIZE));
-        length_ = before + size;
-        start_ = ::mmap(nullptr, length_, PROT_READ, MAP_SHARED, file, static_cast<off_t>(offset - before));
-        const int error = errno;
-        ::close(file);
-        if (start_ == MAP_FAILED) FN_THROW(FNESysError, path + ": " + std::strerror(error));
-        ::madvise(start_, length_, MADV_WILLNEED); // without it is slower, no more
-        bytes_ = static_cast<const unsigned char*>(start_) + before;
+        struct stat status = {};
+        if (file >= 0 && ::fstat(file, &status) == 0 && S_ISREG(status.st_mode)) {
+            size_ = static_cast<std::size_t>(status.st_size);
+            if (size_ != 0) start_ = ::mmap(nullptr, size_, PROT_READ, MAP_SHARED, file, 0);
+        }
+        if (file >= 0) ::close(file);
+        if (!S_ISREG(status.st_mode) || start_ == MAP_FAILED)
+            FN_THROW(FNEIOError, "CmpAlgorithm: File '" + path + "' could not be opened for reading.");
+        if (start_) ::madvise(start_, size_, MADV_WILLNEED); // without it is slower, no more
     }
-    const unsigned char* bytes() const { return bytes_; }
-    void del(void*) const override { ::munmap(start_, length_); }
+    std::span<char> bytes() const { return {static_cast<char*>(start_), size_}; }
+    void del(void*) const override {} // what is left of the file stays
+    ~MappedFile() override {
+        if (start_) ::munmap(start_, size_);
+    }
 
 private:
-    void* start_;
-    std::size_t length_;
-    const unsigned char* bytes_;
+    void* start_ = nullptr;
+    std::size_t size_ = 0;
+};
+
+/// Reads a mapped file.
+class MappedStream final : std::streambuf, public std::istream {
+public:
+    explicit MappedStream(const FNCountedPtr<MappedFile>& file) : std::istream(this), file_(file) {
+        const std::span<char> bytes = file_->bytes();
+        setg(bytes.data(), bytes.data(), bytes.data() + bytes.size());
+    }
+    /// The next bytes, where they are; nothing if there are not as many.
+    std::optional<FNRMemCore> take(std::size_t size) {
+        if (static_cast<std::size_t>(egptr() - gptr()) < size) return {};
+        const FNRMemCore bytes(static_cast<const void*>(gptr()), size, file_, false);
+        setg(eback(), gptr() + size, egptr());
+        return bytes;
+    }
+
+private:
+    FNCountedPtr<MappedFile> file_;
 };
 
 /// The package of a matrix, which stays in the file.
 /// @return an empty matrix if it is not one of so many rows, or ends early
-Weights mapMatrix(std::istream& stream, const std::string& path, std::size_t rows, std::size_t components) {
+Weights matrixIn(MappedStream& stream, std::size_t rows, std::size_t components) {
     const std::uint32_t cores = readCount(stream), dimensions = readCount(stream), size = readCount(stream);
     const std::uint32_t storedRows = readCount(stream), cols = readCount(stream);
     if (!stream || cores != 2 || dimensions != 8 || storedRows != rows || size != std::uint64_t{rows} * cols)
         return Weights(0, 0);
     if (cols != components) return Weights(0, cols);
-    const auto begin = static_cast<std::size_t>(stream.tellg());
-    if (size == 0 || std::filesystem::file_size(path) < begin + size) return Weights(0, 0);
-    stream.seekg(size, std::ios::cur);
-    const FNCountedPtr<MappedBytes> file(new MappedBytes(path, begin, size));
-    return Weights(FNRMem<signed char>(FNRMemCore(file->bytes(), size, file, false)), rows, cols);
+    const std::optional<FNRMemCore> weights = stream.take(size);
+    return weights ? Weights(FNRMem<signed char>(*weights), rows, cols) : Weights(0, 0);
 }
 
 } // namespace
 
 Transformation Transformation::read(const std::string& path, std::size_t rawSize, std::size_t components) {
-    std::ifstream stream(path, std::ios::binary);
-    if (!stream) FN_THROW(FNEIOError, "CmpAlgorithm: File '" + path + "' could not be opened for reading.");
+    MappedStream stream(FNCountedPtr<MappedFile>(new MappedFile(path)));
     const auto vector = [&](const char* before, std::size_t size) {
         return readPackage<FNVector<float>>(stream, path, before, "", size);
     };
     const float factor =
         readPackage<Factor>(stream, path, "float factor package reading file '", "'", 1).value;
-    const Weights matrix = mapMatrix(stream, path, rawSize, components);
+    const Weights matrix = matrixIn(stream, rawSize, components);
     if (matrix.cols() != components && matrix.cols() != 0)
         FN_THROW(FNEIOError, "PCLD: incompatible number of vector components.  Matrix cols = " +
                                  std::to_string(matrix.cols()) +
