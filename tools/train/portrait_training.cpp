@@ -84,6 +84,19 @@ std::pair<double, double> bestBalance(const std::vector<double>& values, const s
     return best;
 }
 
+/// The threshold at which both classes are told right equally often.
+double equalThreshold(const std::vector<double>& values, const std::vector<float>& targets) {
+    std::vector<double> positive, negative;
+    for (std::size_t i = 0; i < values.size(); ++i)
+        (targets[i] > 0 ? positive : negative).push_back(values[i]);
+    double low = 0, high = 1; // share that is right
+    for (int step = 0; step < 20; ++step) {
+        const double share = (low + high) / 2;
+        (quantile(negative, share) < quantile(positive, 1 - share) ? low : high) = share;
+    }
+    return (quantile(negative, low) + quantile(positive, 1 - low)) / 2;
+}
+
 double meanError(const std::vector<double>& values, const std::vector<float>& targets) {
     double sum = 0;
     for (std::size_t i = 0; i < values.size(); ++i)
@@ -146,9 +159,18 @@ public:
     }
 
 private:
-    const PortraitSet& set(const std::string& folder) {
-        const auto found = sets_.find(folder);
+    const PortraitSet& set(const std::string& folder, PortraitViews views = PortraitViews::first) {
+        const std::pair key(folder, views);
+        const auto found = sets_.find(key);
         if (found != sets_.end()) return found->second;
+        return sets_
+            .emplace(key, folder == "portraits/eyes"      ? loadEyePictures(sources_, folder)
+                          : views == PortraitViews::first ? firstViews(folder)
+                                                          : furtherViews(folder))
+            .first->second;
+    }
+
+    PortraitSet firstViews(const std::string& folder) const {
         static const std::map<std::string, std::vector<K>> kinds{
             {"portraits/light", {K::lighting}},
             {"video/webcam", {K::glasses}},
@@ -162,24 +184,29 @@ private:
             {"people/lfw", {K::pose, K::mouth, K::head, K::closedEyes, K::gazeAway, K::iris, K::gender}},
         };
         constexpr std::size_t all = 1000000, ofLfw = 4000;
-        return sets_
-            .emplace(folder, folder == "portraits/eyes"
-                                 ? loadEyePictures(sources_, folder)
-                                 : loadPortraits(sources_, folder, kinds.at(folder), wanted_,
-                                                 folder == "people/lfw" ? ofLfw : all))
-            .first->second;
+        return loadPortraits(sources_, folder, kinds.at(folder), wanted_, PortraitViews::first,
+                             folder == "people/lfw" ? ofLfw : all);
+    }
+
+    /// Of what the step wants only, and of all pictures.
+    PortraitSet furtherViews(const std::string& folder) const {
+        return loadPortraits(sources_, folder, wanted_, wanted_, PortraitViews::further);
     }
 
     /// Collects what `use(set, i, samples of the split)` adds.
     template <class Use>
-    Learning collect(const std::vector<std::string>& folders, std::size_t mostTrain, Use use) {
+    Learning collect(const std::vector<std::string>& folders, std::size_t mostTrain, Use use,
+                     bool withFurtherViews = false) {
         FloatSamples train, dev;
-        for (const std::string& folder : folders) {
-            const PortraitSet& portraits = set(folder);
+        const auto useAll = [&](const PortraitSet& portraits) {
             for (std::size_t i = 0; i < portraits.samples.size(); ++i) {
                 const Split split = portraits.samples[i].split;
                 if (split != Split::test) use(portraits, i, split == Split::train ? train : dev);
             }
+        };
+        for (const std::string& folder : folders) {
+            useAll(set(folder));
+            if (withFurtherViews) useAll(set(folder, PortraitViews::further));
         }
         return learningOf(std::move(train), dev, mostTrain, random_);
     }
@@ -268,17 +295,16 @@ private:
 
     void mouth() {
         const auto use = [](const PortraitSet& set, std::size_t i, FloatSamples& out) {
-            constexpr float open = 0.1f, unclear = 0.02f;
+            // Labels err by as much as the smallest gaps, so these count for little.
+            constexpr float open = 0.1f, clear = 0.05f;
             const auto points = Labelled::Points68::of(set.rowOf(i));
             if (!points) return;
-            const float gap = points->lipGap();
-            if (set.samples[i].split == Split::train && std::abs(gap - open) < unclear) return;
-            out.add(set.features(K::mouth, i), gap > open ? 1.0f : -1.0f);
+            out.add(set.features(K::mouth, i), std::clamp((points->lipGap() - open) / clear, -1.0f, 1.0f));
         };
         Learning learning =
-            collect({"portraits/mtfl", "scenes/faces", "people/celeba", "people/lfw"}, 14000, use);
+            collect({"portraits/mtfl", "scenes/faces", "people/celeba", "people/lfw"}, 24000, use, true);
         balance(learning.samples);
-        classifier("cmdisc.dat", learning, 24, {1}, {-0.5, 0.95, true, 1});
+        classifier("cmdisc.dat", learning, 48, {1}, {-0.5, 0.95, true, 1});
     }
 
     void closedEyes() {
@@ -415,7 +441,6 @@ private:
     }
 
     void gender() {
-        constexpr std::size_t mostLabelled = 11000, mostTaken = 5000;
         const auto use = [](const PortraitSet& set, std::size_t i, FloatSamples& out) {
             constexpr double adult = 16;
             const auto years = Labelled::ageOf(set.rowOf(i));
@@ -425,65 +450,81 @@ private:
             out.add(set.features(K::gender, i), set.rowOf(i).text("gender") == "m" ? 1.0f : -1.0f,
                     child ? 0.3f : 1.0f);
         };
-        const std::vector<std::string> labelled{"portraits/utkface", "portraits/fairface", "portraits/mtfl"};
-        Learning learning = collect(labelled, mostLabelled, use);
+        constexpr std::size_t all = 1000000, directions = 32;
+        constexpr double penalty = 4;
+        Learning learning = collect({"portraits/utkface", "portraits/fairface", "portraits/mtfl"}, all, use);
         balance(learning.samples);
-        std::cout << "gedisc.dat: " << learning.train << " samples\n" << std::flush;
-        QuadraticFunction first;
-        {
-            const QuadraticRegression regression(learning.samples.features);
-            first = regression.reduced(learning.trainIndices(),
-                                       regression.solve(learning.trainIndices(),
-                                                        learning.head(learning.samples.targets),
-                                                        learning.head(learning.samples.weights), 1),
-                                       16);
-            const auto [balance, threshold] = bestBalance(devValues(first, learning), devTargets(learning));
-            first.constant -= threshold;
-            std::cout << "  labelled ones alone: " << balance << " on dev\n" << std::flush;
-        }
+        std::vector<std::span<const float>> features = learning.samples.features;
+        const std::vector<std::vector<std::size_t>> persons = addPersons(features);
+        std::cout << "gedisc.dat: " << learning.train << " samples, " << persons.size() << " persons\n"
+                  << std::flush;
+        const QuadraticRegression regression(features);
+        std::vector<std::size_t> chosen = learning.trainIndices();
+        std::vector<float> solution = regression.solve(chosen, learning.head(learning.samples.targets),
+                                                       learning.head(learning.samples.weights), penalty);
+        double threshold = genderThreshold(regression, chosen, solution, learning);
+
         // What several pictures of one known person agree on is taken for a label of all of them.
-        FloatSamples taken;
+        FloatSamples train;
+        for (const std::size_t i : chosen)
+            train.add(features[i], learning.samples.targets[i], learning.samples.weights[i]);
+        const std::vector<std::size_t> labelled = chosen;
+        for (const std::vector<std::size_t>& pictures : persons) {
+            constexpr double agreed = 0.25, clear = 1.5;
+            constexpr float trust = 0.7f;
+            double sum = 0;
+            for (const std::size_t i : pictures)
+                sum += std::clamp(regression.predict(labelled, solution, i) - threshold, -clear, clear);
+            const double mean = sum / static_cast<double>(pictures.size());
+            if (std::abs(mean) < agreed) continue;
+            for (const std::size_t i : pictures) {
+                chosen.push_back(i);
+                train.add(features[i], mean > 0 ? 1.0f : -1.0f, trust);
+            }
+        }
+        balance(train);
+        std::cout << "  with " << train.size() - learning.train << " of known persons\n" << std::flush;
+        solution = regression.solve(chosen, train.targets, train.weights, penalty);
+        genderThreshold(regression, chosen, solution, learning);
+        const QuadraticFunction function = regression.reduced(chosen, solution, directions);
+        const std::vector<double> values = devValues(function, learning);
+        threshold = equalThreshold(values, devTargets(learning));
+        std::cout << "  reduced: " << bestBalance(values, devTargets(learning)).first << " on dev\n"
+                  << std::flush;
+        save(machineOf(function, 1, -threshold, "gedisc.dat"), folder_ / "gedisc.dat");
+    }
+
+    /// Adds the portraits of persons of whom there are several in the train part.
+    /// @return the indices of each person's
+    std::vector<std::vector<std::size_t>> addPersons(std::vector<std::span<const float>>& features) {
+        constexpr std::size_t fewest = 4; // two pictures and their mirror images
+        std::vector<std::vector<std::size_t>> persons;
         for (const char* folder : {"people/celeba", "people/lfw"}) {
             const PortraitSet& people = set(folder);
-            struct Person {
-                double sum = 0;
-                std::vector<std::size_t> samples;
-            };
-            std::map<std::string, Person> persons;
-            for (std::size_t i = 0; i < people.samples.size(); ++i) {
-                if (people.samples[i].split != Split::train) continue;
-                Person& person = persons[people.rowOf(i).text("person")];
-                person.sum += std::clamp(first(people.features(K::gender, i)), -1.5, 1.5);
-                person.samples.push_back(i);
-            }
-            for (const auto& [name, person] : persons) {
-                constexpr std::size_t fewest = 4; // two pictures and their mirror images
-                constexpr double agreed = 0.5;
-                const double mean = person.sum / static_cast<double>(person.samples.size());
-                if (person.samples.size() < fewest || std::abs(mean) < agreed) continue;
-                for (const std::size_t i : person.samples)
-                    taken.add(people.features(K::gender, i), mean > 0 ? 1.0f : -1.0f, 0.7f);
+            std::map<std::string, std::vector<std::size_t>> byName;
+            for (std::size_t i = 0; i < people.samples.size(); ++i)
+                if (people.samples[i].split == Split::train)
+                    byName[people.rowOf(i).text("person")].push_back(i);
+            for (const auto& [name, samples] : byName) {
+                if (samples.size() < fewest) continue;
+                persons.emplace_back();
+                for (const std::size_t i : samples) {
+                    persons.back().push_back(features.size());
+                    features.push_back(people.features(K::gender, i));
+                }
             }
         }
-        thinOut(taken, mostTaken, random_);
-        FloatSamples train = learning.samples, dev;
+        return persons;
+    }
+
+    /// Where men and women of dev are told apart.
+    double genderThreshold(const QuadraticRegression& regression, const std::vector<std::size_t>& chosen,
+                           const std::vector<float>& solution, const Learning& learning) {
+        std::vector<double> values;
         for (std::size_t i = learning.train; i < learning.samples.size(); ++i)
-            dev.add(learning.samples.features[i], learning.samples.targets[i]);
-        train.features.resize(learning.train);
-        train.targets.resize(learning.train);
-        train.weights.resize(learning.train);
-        for (std::size_t i = 0; i < taken.size(); ++i)
-            train.add(taken.features[i], taken.targets[i], taken.weights[i]);
-        Learning all = learningOf(std::move(train), dev, mostLabelled + mostTaken, random_);
-        balance(all.samples);
-        std::cout << "  with " << taken.size() << " of known persons\n" << std::flush;
-        const QuadraticRegression regression(all.samples.features);
-        const QuadraticFunction function =
-            regression.reduced(all.trainIndices(), bestSolution(regression, all, {1}, classification), 24);
-        const std::vector<double> values = devValues(function, all);
-        const auto [balance, threshold] = bestBalance(values, devTargets(all));
-        std::cout << "  reduced: " << balance << " on dev\n" << std::flush;
-        save(machineOf(function, 1, -threshold, "gedisc.dat"), folder_ / "gedisc.dat");
+            values.push_back(regression.predict(chosen, solution, i));
+        std::cout << "  " << bestBalance(values, devTargets(learning)).first << " on dev\n" << std::flush;
+        return equalThreshold(values, devTargets(learning));
     }
 
     void age() {
@@ -585,7 +626,7 @@ private:
 
     /// By the picture that the features are of.
     std::size_t foldOf(const float* features) const {
-        for (const auto& [folder, set] : sets_) {
+        for (const auto& [key, set] : sets_) {
             const Span all = set.features(K::age, 0);
             const std::ptrdiff_t offset = features - all.data();
             const auto i = static_cast<std::size_t>(offset) / set.dimension(K::age);
@@ -636,8 +677,8 @@ private:
     TrainingSources sources_;
     std::filesystem::path folder_;
     std::mt19937_64 random_;
-    std::map<std::string, PortraitSet> sets_; ///< of the present step
-    std::vector<K> wanted_;                   ///< by the present step
+    std::map<std::pair<std::string, PortraitViews>, PortraitSet> sets_; ///< of the present step
+    std::vector<K> wanted_;                                             ///< by the present step
 };
 
 } // namespace
