@@ -304,7 +304,7 @@ private:
         Learning learning =
             collect({"portraits/mtfl", "scenes/faces", "people/celeba", "people/lfw"}, 24000, use, true);
         balance(learning.samples);
-        classifier("cmdisc.dat", learning, 48, {1}, {-0.5, 0.95, true, 1});
+        classifier("cmdisc.dat", learning, 96, {1}, {-0.5, 0.95, true, 1});
     }
 
     void closedEyes() {
@@ -450,7 +450,7 @@ private:
             out.add(set.features(K::gender, i), set.rowOf(i).text("gender") == "m" ? 1.0f : -1.0f,
                     child ? 0.3f : 1.0f);
         };
-        constexpr std::size_t all = 1000000, directions = 32;
+        constexpr std::size_t all = 1000000, directions = 64;
         constexpr double penalty = 4;
         Learning learning = collect({"portraits/utkface", "portraits/fairface", "portraits/mtfl"}, all, use);
         balance(learning.samples);
