@@ -84,19 +84,6 @@ std::pair<double, double> bestBalance(const std::vector<double>& values, const s
     return best;
 }
 
-/// The threshold at which both classes are told right equally often.
-double equalThreshold(const std::vector<double>& values, const std::vector<float>& targets) {
-    std::vector<double> positive, negative;
-    for (std::size_t i = 0; i < values.size(); ++i)
-        (targets[i] > 0 ? positive : negative).push_back(values[i]);
-    double low = 0, high = 1; // share that is right
-    for (int step = 0; step < 20; ++step) {
-        const double share = (low + high) / 2;
-        (quantile(negative, share) < quantile(positive, 1 - share) ? low : high) = share;
-    }
-    return (quantile(negative, low) + quantile(positive, 1 - low)) / 2;
-}
-
 double meanError(const std::vector<double>& values, const std::vector<float>& targets) {
     double sum = 0;
     for (std::size_t i = 0; i < values.size(); ++i)
@@ -441,6 +428,7 @@ private:
     }
 
     void gender() {
+        constexpr std::size_t mostLabelled = 11000, mostTaken = 5000;
         const auto use = [](const PortraitSet& set, std::size_t i, FloatSamples& out) {
             constexpr double adult = 16;
             const auto years = Labelled::ageOf(set.rowOf(i));
@@ -450,81 +438,65 @@ private:
             out.add(set.features(K::gender, i), set.rowOf(i).text("gender") == "m" ? 1.0f : -1.0f,
                     child ? 0.3f : 1.0f);
         };
-        constexpr std::size_t all = 1000000, directions = 64;
-        constexpr double penalty = 4;
-        Learning learning = collect({"portraits/utkface", "portraits/fairface", "portraits/mtfl"}, all, use);
+        const std::vector<std::string> labelled{"portraits/utkface", "portraits/fairface", "portraits/mtfl"};
+        Learning learning = collect(labelled, mostLabelled, use);
         balance(learning.samples);
-        std::vector<std::span<const float>> features = learning.samples.features;
-        const std::vector<std::vector<std::size_t>> persons = addPersons(features);
-        std::cout << "gedisc.dat: " << learning.train << " samples, " << persons.size() << " persons\n"
-                  << std::flush;
-        const QuadraticRegression regression(features);
-        std::vector<std::size_t> chosen = learning.trainIndices();
-        std::vector<float> solution = regression.solve(chosen, learning.head(learning.samples.targets),
-                                                       learning.head(learning.samples.weights), penalty);
-        double threshold = genderThreshold(regression, chosen, solution, learning);
-
-        // What several pictures of one known person agree on is taken for a label of all of them.
-        FloatSamples train;
-        for (const std::size_t i : chosen)
-            train.add(features[i], learning.samples.targets[i], learning.samples.weights[i]);
-        const std::vector<std::size_t> labelled = chosen;
-        for (const std::vector<std::size_t>& pictures : persons) {
-            constexpr double agreed = 0.25, clear = 1.5;
-            constexpr float trust = 0.7f;
-            double sum = 0;
-            for (const std::size_t i : pictures)
-                sum += std::clamp(regression.predict(labelled, solution, i) - threshold, -clear, clear);
-            const double mean = sum / static_cast<double>(pictures.size());
-            if (std::abs(mean) < agreed) continue;
-            for (const std::size_t i : pictures) {
-                chosen.push_back(i);
-                train.add(features[i], mean > 0 ? 1.0f : -1.0f, trust);
-            }
+        std::cout << "gedisc.dat: " << learning.train << " samples\n" << std::flush;
+        QuadraticFunction first;
+        {
+            const QuadraticRegression regression(learning.samples.features);
+            first = regression.reduced(learning.trainIndices(),
+                                       regression.solve(learning.trainIndices(),
+                                                        learning.head(learning.samples.targets),
+                                                        learning.head(learning.samples.weights), 1),
+                                       16);
+            const auto [balance, threshold] = bestBalance(devValues(first, learning), devTargets(learning));
+            first.constant -= threshold;
+            std::cout << "  labelled ones alone: " << balance << " on dev\n" << std::flush;
         }
-        balance(train);
-        std::cout << "  with " << train.size() - learning.train << " of known persons\n" << std::flush;
-        solution = regression.solve(chosen, train.targets, train.weights, penalty);
-        genderThreshold(regression, chosen, solution, learning);
-        const QuadraticFunction function = regression.reduced(chosen, solution, directions);
-        const std::vector<double> values = devValues(function, learning);
-        threshold = equalThreshold(values, devTargets(learning));
-        std::cout << "  reduced: " << bestBalance(values, devTargets(learning)).first << " on dev\n"
-                  << std::flush;
-        save(machineOf(function, 1, -threshold, "gedisc.dat"), folder_ / "gedisc.dat");
-    }
-
-    /// Adds the portraits of persons of whom there are several in the train part.
-    /// @return the indices of each person's
-    std::vector<std::vector<std::size_t>> addPersons(std::vector<std::span<const float>>& features) {
-        constexpr std::size_t fewest = 4; // two pictures and their mirror images
-        std::vector<std::vector<std::size_t>> persons;
+        // What several pictures of one known person agree on is taken for a label of all of them.
+        FloatSamples taken;
         for (const char* folder : {"people/celeba", "people/lfw"}) {
             const PortraitSet& people = set(folder);
-            std::map<std::string, std::vector<std::size_t>> byName;
-            for (std::size_t i = 0; i < people.samples.size(); ++i)
-                if (people.samples[i].split == Split::train)
-                    byName[people.rowOf(i).text("person")].push_back(i);
-            for (const auto& [name, samples] : byName) {
-                if (samples.size() < fewest) continue;
-                persons.emplace_back();
-                for (const std::size_t i : samples) {
-                    persons.back().push_back(features.size());
-                    features.push_back(people.features(K::gender, i));
-                }
+            struct Person {
+                double sum = 0;
+                std::vector<std::size_t> samples;
+            };
+            std::map<std::string, Person> persons;
+            for (std::size_t i = 0; i < people.samples.size(); ++i) {
+                if (people.samples[i].split != Split::train) continue;
+                Person& person = persons[people.rowOf(i).text("person")];
+                person.sum += std::clamp(first(people.features(K::gender, i)), -1.5, 1.5);
+                person.samples.push_back(i);
+            }
+            for (const auto& [name, person] : persons) {
+                constexpr std::size_t fewest = 4; // two pictures and their mirror images
+                constexpr double agreed = 0.5;
+                const double mean = person.sum / static_cast<double>(person.samples.size());
+                if (person.samples.size() < fewest || std::abs(mean) < agreed) continue;
+                for (const std::size_t i : person.samples)
+                    taken.add(people.features(K::gender, i), mean > 0 ? 1.0f : -1.0f, 0.7f);
             }
         }
-        return persons;
-    }
-
-    /// Where men and women of dev are told apart.
-    double genderThreshold(const QuadraticRegression& regression, const std::vector<std::size_t>& chosen,
-                           const std::vector<float>& solution, const Learning& learning) {
-        std::vector<double> values;
+        thinOut(taken, mostTaken, random_);
+        FloatSamples train = learning.samples, dev;
         for (std::size_t i = learning.train; i < learning.samples.size(); ++i)
-            values.push_back(regression.predict(chosen, solution, i));
-        std::cout << "  " << bestBalance(values, devTargets(learning)).first << " on dev\n" << std::flush;
-        return equalThreshold(values, devTargets(learning));
+            dev.add(learning.samples.features[i], learning.samples.targets[i]);
+        train.features.resize(learning.train);
+        train.targets.resize(learning.train);
+        train.weights.resize(learning.train);
+        for (std::size_t i = 0; i < taken.size(); ++i)
+            train.add(taken.features[i], taken.targets[i], taken.weights[i]);
+        Learning all = learningOf(std::move(train), dev, mostLabelled + mostTaken, random_);
+        balance(all.samples);
+        std::cout << "  with " << taken.size() << " of known persons\n" << std::flush;
+        const QuadraticRegression regression(all.samples.features);
+        const QuadraticFunction function =
+            regression.reduced(all.trainIndices(), bestSolution(regression, all, {1}, classification), 24);
+        const std::vector<double> values = devValues(function, all);
+        const auto [balance, threshold] = bestBalance(values, devTargets(all));
+        std::cout << "  reduced: " << balance << " on dev\n" << std::flush;
+        save(machineOf(function, 1, -threshold, "gedisc.dat"), folder_ / "gedisc.dat");
     }
 
     void age() {
