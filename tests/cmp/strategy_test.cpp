@@ -1,4 +1,4 @@
-#include "cmp/number_records.h"
+#include "support/number_records.h"
 
 #include "support/thrown.h"
 

@@ -1,12 +1,15 @@
 #include "fn/byte_order.h"
 #include "fn/package_view.h"
 #include "fn/serialize.h"
+#include "support/each_target.h"
 #include "support/thrown.h"
 
 #include <gtest/gtest.h>
 
+#include <bit>
 #include <functional>
 #include <limits>
+#include <numeric>
 #include <sstream>
 
 namespace {
@@ -61,6 +64,20 @@ TEST(Package, RealArraysHaveTheStoredForm) {
     double back[2];
     ntohd(stored, back, 2);
     EXPECT_EQ(back[1], doubles[1]);
+
+    forEachTarget([] {
+        for (std::size_t n = 0; n < 70; ++n) {
+            Bytes bytes(4 * n + 1); // not aligned
+            std::iota(bytes.begin(), bytes.end(), static_cast<unsigned char>(n));
+            std::vector<float> values(n);
+            ntohf(bytes.data() + 1, values.data(), n);
+            for (std::size_t i = 0; i < n; ++i)
+                ASSERT_EQ(std::bit_cast<std::uint32_t>(values[i]), Fn::loadUInt32(&bytes[4 * i + 1]));
+            Bytes again(4 * n + 1, bytes[0]);
+            htonf(values.data(), again.data() + 1, n);
+            ASSERT_EQ(again, bytes);
+        }
+    });
 }
 
 TEST(Package, ListsFlattenAndUnfold) {

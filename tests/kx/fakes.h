@@ -1,6 +1,6 @@
 #pragma once
 
-#include "cmp/number_records.h"
+#include "support/number_records.h"
 #include "eye/eyes_finder.h"
 #include "fn/deployment/app_config_db.h"
 #include "fn/deployment/component.h"

@@ -1,10 +1,7 @@
-#include "cmp/b7/cmp_algorithm.h"
-#include "cmp/b7/transformation.h"
-#include "cmp/mapping_files.h"
 #include "orbek/facial_matching_engine.h"
 #include "orbek/fir_builder.h"
 #include "orbek/implementation/comparison.h"
-#include "support/scratch_folder.h"
+#include "support/b7_setup.h"
 #include "support/thrown.h"
 
 #include <gtest/gtest.h>
@@ -17,31 +14,17 @@ using namespace Orbek;
 namespace {
 
 /// A folder with mappings from raw scores of 0 to 4000 to scores, and a projection that is not used.
-class MatchingWithModels : public testing::Test {
+class MatchingWithModels : public B7Setup {
 protected:
     static void SetUpTestSuite() {
-        folder_ = new ScratchFolder;
-        const auto zeros = [](std::size_t n) { return FNVector<float>(n, 0.0f); };
-        Cmp::B7::Transformation t{1, Fn::Matrix<signed char>(20604, 5912), zeros(20604), zeros(5912),
-                                  zeros(5912)};
-        t.matrix.fill(0);
-        t.write(folder_->file("trans-b7.dat"));
-        const auto table = [](float first, float last, float xMax) {
-            return Fn::InvertibleFunction<float, float>(FNVector<float>(std::vector{first, last}), 0, xMax);
-        };
-        const auto write = [&](const char* name, const auto& mapping) {
-            Cmp::Implementation::writeMappingFile(mapping, folder_->file(name));
-        };
-        write("smap-b7.dat", table(0, 1, 4000));
-        write("farmap-b7.dat", table(1, 0, 1));
-        write("frrmap-b7.dat", table(0, 0.5f, 1));
+        B7Setup::SetUpTestSuite();
+        writeMappings();
     }
-    static void TearDownTestSuite() { delete folder_; }
 
     static Configuration configuration(const std::string& more = {}) {
         std::istringstream text("ORBEK.Substitutions.INSTALLDIR = " ORBEK_BINARY_DIR "\n"
                                 "ORBEK.ComparisonAlgorithm.AlgorithmVersion.B7.DataDir = " +
-                                folder_->path().string() + "\n" + more);
+                                folder().path().string() + "\n" + more);
         return Configuration(text);
     }
 
@@ -63,8 +46,6 @@ protected:
         stream << builder.build(memory);
         return builder.build(stream);
     }
-
-    static inline ScratchFolder* folder_ = nullptr;
 };
 
 TEST_F(MatchingWithModels, RecordsComeBackFromTheirBytes) {
@@ -152,16 +133,16 @@ TEST_F(MatchingWithModels, ScoresTellRatesAndRawScores) {
 }
 
 TEST_F(MatchingWithModels, SamplesAreMeasuredByThePortraitAnalyzer) {
-    const std::string folder = folder_->path().string();
+    const std::string models = folder().path().string();
     const Configuration c = configuration(
-        "ORBEK.ComparisonAlgorithm.AlgorithmVersion.B7.PortraitAnalyzer.DataDir = " + folder + "\n");
+        "ORBEK.ComparisonAlgorithm.AlgorithmVersion.B7.PortraitAnalyzer.DataDir = " + models + "\n");
     const Cmp::RecordBuilder builder = Comparison(c).strategy().algorithm()->createRecordBuilder();
     FNImage<unsigned char> image(300, 300);
     for (std::uint32_t i = 0; i < image.size(); ++i)
         image.getExclusive()[i] = static_cast<unsigned char>(i * 2654435761u >> 24);
     const Cmp::Sample sample(FNImageReferenceFactory::create(image), {120, 100}, {180, 100});
     EXPECT_EQ(thrownBy([&] { builder->pushSample(sample); }),
-              "FNEIOError: Could not open data file " + folder + "/fpdisc.dat for reading");
+              "FNEIOError: Could not open data file " + models + "/fpdisc.dat for reading");
 }
 
 TEST(Matching, NeedsItsModelsWhenItIsFirstUsed) {

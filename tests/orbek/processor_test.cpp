@@ -1,5 +1,3 @@
-#include "cmp/b7_setup.h"
-#include "cmp/mapping_files.h"
 #include "drawn_image.h"
 #include "orbek/enrollment.h"
 #include "orbek/fir_builder.h"
@@ -8,6 +6,7 @@
 #include "orbek/implementation/adapt_sample.h"
 #include "orbek/implementation/adapt_shape.h"
 #include "orbek/verification.h"
+#include "support/b7_setup.h"
 #include "support/labelled_photos.h"
 #include "support/thrown.h"
 
@@ -147,14 +146,7 @@ class ProcessorsWithModels : public B7Setup {
 protected:
     static void SetUpTestSuite() {
         B7Setup::SetUpTestSuite();
-        const auto write = [](const char* name, float first, float last, float xMax) {
-            const Fn::InvertibleFunction<float, float> mapping(FNVector<float>(std::vector{first, last}), 0,
-                                                               xMax);
-            Cmp::Implementation::writeMappingFile(mapping, folder().file(name));
-        };
-        write("smap-b7.dat", 0, 1, 4000);
-        write("farmap-b7.dat", 1, 0, 1);
-        write("frrmap-b7.dat", 0, 1, 1);
+        writeMappings();
     }
 
     static Configuration configuration(const std::string& more = {}) {

@@ -6,8 +6,7 @@
 #include "demo_page.h"
 #include "enrolment.h"
 #include "gallery_import.h"
-#include "orbek/facial_matching_engine.h"
-#include "orbek/population.h"
+#include "gallery_search.h"
 #include "parallel.h"
 #include "record_file.h"
 #include "whole_file.h"
@@ -155,7 +154,7 @@ int demonstrate(const DemoOptions& options) {
     (void)gallery.add(entries, GalleryFile::Present::Kept, builder);
     if (entries.empty()) throw UnreadableInput(options.photos + ": nobody could be enrolled");
 
-    const Population population = gallery.load(configuration, options.jobs);
+    const GallerySearch search(configuration, options.jobs);
     const FacialMatchingEngine engine(configuration);
     for (std::size_t i = 0; i < probes.size(); ++i) {
         Demonstration::Probe& probe = demo.probes[i];
@@ -170,14 +169,14 @@ int demonstrate(const DemoOptions& options) {
             told["score"] = rounded(*probe.score, 6);
             told["match"] = *probe.score > demo.threshold;
         }
-        const auto matches = engine.bestMatches(*probes[i], population, 0.0f, shownCandidates);
-        for (const Match& match : *matches) {
+        const std::list<Match> matches = search.bestMatches(*probes[i], gallery, 0.0f, shownCandidates);
+        for (const Match& match : matches) {
             const auto person = std::ranges::find(demo.people, match.name, &Demonstration::Person::name);
             probe.candidates.push_back({static_cast<std::size_t>(person - demo.people.begin()), match.score});
         }
-        const bool found = !matches->empty() && matches->front().score > demo.threshold;
-        told["identified"] = found ? Json(matches->front().name) : Json();
-        if (found) told["candidate_score"] = rounded(matches->front().score, 6);
+        const bool found = !matches.empty() && matches.front().score > demo.threshold;
+        told["identified"] = found ? Json(matches.front().name) : Json();
+        if (found) told["candidate_score"] = rounded(matches.front().score, 6);
         output.result(told);
     }
     demo.seconds = std::chrono::duration<double>(std::chrono::steady_clock::now() - begin).count();

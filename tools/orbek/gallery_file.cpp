@@ -8,7 +8,6 @@
 #include <cstring>
 #include <filesystem>
 #include <list>
-#include <mutex>
 #include <string_view>
 #include <utility>
 
@@ -24,8 +23,8 @@ constexpr const char* schema = "CREATE TABLE entry (id TEXT NOT NULL UNIQUE, rec
 constexpr int pageSize = 32768;
 /// How long to wait for other processes.
 constexpr int patienceMilliseconds = 60000;
-/// Entries that a thread reads at a time, at least; and in how many portions all are read, at most.
-constexpr std::uint64_t smallestPortion = 1024, mostPortions = 1024;
+/// Portions that threads share, at most.
+constexpr std::uint64_t mostPortions = 1024;
 
 /// Others have held a lock for longer than one waits.
 class InUse : public std::runtime_error {
@@ -256,9 +255,9 @@ std::vector<std::string> GalleryFile::remove(const std::vector<std::string>& ids
     return missing;
 }
 
-Population GalleryFile::load(const Configuration& configuration, unsigned int jobs) const {
+void GalleryFile::read(const Configuration& configuration, std::uint64_t partSize, unsigned int jobs,
+                       const std::function<void(const Population& part)>& take) const {
     const FIRBuilder builder(configuration);
-    Population population(configuration);
     // Those that read at the same time see the same state: as many as get in beside the first one.
     std::list<Connection> readers;
     while (readers.size() < std::max(jobs, 1u)) {
@@ -282,20 +281,20 @@ Population GalleryFile::load(const Configuration& configuration, unsigned int jo
 
     const auto first = static_cast<std::uint64_t>(readers.front().number("SELECT min(rowid) FROM entry"));
     const auto last = static_cast<std::uint64_t>(readers.front().number("SELECT max(rowid) FROM entry"));
-    const std::uint64_t portion = std::max((last - first) / mostPortions + 1, smallestPortion);
-    std::mutex mutex; // guards the population
+    // Ids of rows need not be dense, and may lie anywhere: threads take ranges of them, not too many.
+    const std::uint64_t portion = std::max((last - first) / mostPortions + 1, partSize);
     inParallel(readers.size(), (last - first) / portion + 1, [&](std::size_t thread, std::size_t item) {
         const std::uint64_t begin = first + item * portion, end = begin + std::min(portion - 1, last - begin);
         Statement& selection = selectionOf[thread]
                                    ->number(1, static_cast<std::int64_t>(begin))
                                    .number(2, static_cast<std::int64_t>(end));
-        std::vector<std::pair<std::string, FIR>> entries;
-        entries.reserve(std::min(portion, smallestPortion)); // ids need not be dense
-        while (selection.step()) entries.emplace_back(selection.bytes(0), selection.record(builder));
-        const std::lock_guard lock(mutex);
-        for (const auto& [id, record] : entries) population.append(record, id);
+        for (bool more = selection.step(); more;) {
+            Population part(configuration);
+            for (std::uint64_t size = 0; more && size < partSize; ++size, more = selection.step())
+                part.append(selection.record(builder), std::string(selection.bytes(0)));
+            take(part);
+        }
     });
-    return population;
 }
 
 } // namespace Orbek::Tool

@@ -3,6 +3,8 @@
 #include "orbek/fir_builder.h"
 #include "orbek/population.h"
 
+#include <cstdint>
+#include <functional>
 #include <memory>
 #include <string>
 #include <vector>
@@ -50,9 +52,12 @@ public:
     /// Removes those that are there. @return the ids that are not, in the given order
     std::vector<std::string> remove(const std::vector<std::string>& ids);
 
-    /// All records, ready for a search.
-    /// @param jobs threads that share the work
-    Population load(const Configuration& configuration, unsigned int jobs) const;
+    /// Gives all records to `take`, part by part, so that a gallery may be larger than memory. All parts show
+    /// the same state.
+    /// @param partSize records of a part, at most
+    /// @param jobs threads that share the work; `take` is called on them, at the same time
+    void read(const Configuration& configuration, std::uint64_t partSize, unsigned int jobs,
+              const std::function<void(const Population& part)>& take) const;
 
 private:
     class Connection;

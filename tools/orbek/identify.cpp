@@ -2,13 +2,10 @@
 
 #include "command.h"
 #include "configuration_file.h"
-#include "gallery_file.h"
-#include "orbek/identification.h"
-#include "picture_lines.h"
+#include "enrolment.h"
+#include "gallery_search.h"
 
 #include <memory>
-
-#include <malloc.h>
 
 namespace Orbek::Tool {
 namespace {
@@ -23,30 +20,27 @@ struct IdentifyOptions : CommonOptions {
     unsigned int jobs = 0;
 };
 
-class Identified final : public PictureLines<Identification::FeedbackBody> {
-public:
-    Identified(Output& output, std::list<Match>& matches) : PictureLines(output), matches_(matches) {}
-    void matches(const std::list<Match>& matches) override { matches_ = matches; }
-
-private:
-    std::list<Match>& matches_;
-};
+/// Lets enrolments look for eyes as identifications do.
+void enrolAsIdentified(Configuration& configuration) {
+    for (const std::string limit : {"MinEyeDistance", "MaxEyeDistance"})
+        configuration.setValue("ORBEK.SetEnroller.EyeDistanceRange." + limit,
+                               configuration.getValue("ORBEK.SetIdentifier.EyeDistanceRange." + limit));
+    configuration.setValue("ORBEK.SetEnroller.MinNumOfSamples", "1");
+}
 
 int identify(const IdentifyOptions& options) {
     const std::vector<std::filesystem::path> files = pictureFiles(options.images);
     const GalleryFile gallery(options.gallery);
     Configuration configuration = openConfiguration(options.configuration);
-    configuration.setValue("ORBEK.ComparisonAlgorithm.NumberOfThreads", std::to_string(options.jobs));
-    (void)mallopt(M_TOP_PAD, 64 << 20); // records are many: the heaps grow by large steps
-    // It goes with the process, which is faster than taking it apart.
-    static const Population& population = *new Population(gallery.load(configuration, options.jobs));
+    enrolAsIdentified(configuration);
+    const GallerySearch search(configuration, options.jobs);
     const Score threshold = ScoreMappings(configuration).requestFAR(options.far);
-    const Identification::Processor processor(configuration, population);
+    const Enrollment::Processor processor(configuration);
     Output output(options, files.size());
-    const std::list<Sample> samples = samplesOf(files);
     std::list<Match> matches;
-    processor.process(samples.begin(), samples.end(), threshold,
-                      Identification::Feedback(new Identified(output, matches)), options.top);
+    for (auto file = files.begin(); file != files.end() && matches.empty(); ++file)
+        if (const std::optional<FIR> record = enrolPictures(processor, {*file}, output))
+            matches = search.bestMatches(*record, gallery, threshold, options.top);
     nlohmann::ordered_json list = nlohmann::ordered_json::array();
     for (const Match& match : matches)
         list.push_back({{"id", match.name}, {"score", rounded(match.score, 6)}});

@@ -2,18 +2,19 @@
 
 #include "fn/byte_order.h"
 
-#include <algorithm>
-#include <cstdlib>
+#include <filesystem>
 #include <fstream>
+#include <optional>
+#include <span>
 
+#include <fcntl.h>
 #include <sys/mman.h>
+#include <sys/stat.h>
+#include <unistd.h>
 
 namespace Cmp::B7 {
 
 namespace {
-
-/// Vectors are loaded from whole multiples of so many weights.
-constexpr std::size_t rowUnit = 16;
 
 using Weights = Fn::Matrix<signed char>;
 
@@ -46,55 +47,81 @@ T readPackage(std::istream& stream, const std::string& path, const char* before,
     failInvalid(before, path, behind);
 }
 
-/// Memory in large pages, where the system has them: a projection goes over all of it, and most of the time
-/// that fresh memory takes is that of its pages.
-FNRMemCore largeBlock(std::size_t size) {
-    struct Free final : FNRMemCore::Dtor {
-        void del(void* memory) const override { std::free(memory); }
-    };
-    constexpr std::size_t largePage = std::size_t{2} << 20;
-    const std::size_t whole = (size + largePage - 1) / largePage * largePage;
-    void* const memory = std::aligned_alloc(largePage, whole);
-    if (!memory) throw std::bad_alloc();
-    madvise(memory, whole, MADV_HUGEPAGE); // without them it is slower, no more
-    return FNRMemCore(memory, size, FNCountedPtr<FNRMemCore::Dtor>(new Free));
-}
-
 std::uint32_t readCount(std::istream& stream) {
     unsigned char bytes[4] = {};
     stream.read(reinterpret_cast<char*>(bytes), sizeof bytes);
     return Fn::loadUInt32(bytes);
 }
 
-/// The package of a matrix, each column read straight to where it stays.
+/// A file where the system has it: nothing is copied, and all processes share it. It may be replaced
+/// meanwhile, but not be written over.
+class MappedFile final : public FNRMemCore::Dtor {
+public:
+    /// @throws FNEIOError
+    explicit MappedFile(const std::string& path) {
+        const int file = ::open(path.c_str(), O_RDONLY | O_CLOEXEC);
+        struct stat status = {};
+        if (file >= 0 && ::fstat(file, &status) == 0 && S_ISREG(status.st_mode)) {
+            size_ = static_cast<std::size_t>(status.st_size);
+            if (size_ != 0) start_ = ::mmap(nullptr, size_, PROT_READ, MAP_SHARED, file, 0);
+        }
+        if (file >= 0) ::close(file);
+        if (!S_ISREG(status.st_mode) || start_ == MAP_FAILED)
+            FN_THROW(FNEIOError, "CmpAlgorithm: File '" + path + "' could not be opened for reading.");
+        if (start_) ::madvise(start_, size_, MADV_WILLNEED); // without it is slower, no more
+    }
+    std::span<char> bytes() const { return {static_cast<char*>(start_), size_}; }
+    void del(void*) const override {} // what is left of the file stays
+    ~MappedFile() override {
+        if (start_) ::munmap(start_, size_);
+    }
+
+private:
+    void* start_ = nullptr;
+    std::size_t size_ = 0;
+};
+
+/// Reads a mapped file.
+class MappedStream final : std::streambuf, public std::istream {
+public:
+    explicit MappedStream(const FNCountedPtr<MappedFile>& file) : std::istream(this), file_(file) {
+        const std::span<char> bytes = file_->bytes();
+        setg(bytes.data(), bytes.data(), bytes.data() + bytes.size());
+    }
+    /// The next bytes, where they are; nothing if there are not as many.
+    std::optional<FNRMemCore> take(std::size_t size) {
+        if (static_cast<std::size_t>(egptr() - gptr()) < size) return {};
+        const FNRMemCore bytes(static_cast<const void*>(gptr()), size, file_, false);
+        setg(eback(), gptr() + size, egptr());
+        return bytes;
+    }
+
+private:
+    FNCountedPtr<MappedFile> file_;
+};
+
+/// The package of a matrix, which stays in the file.
 /// @return an empty matrix if it is not one of so many rows, or ends early
-Weights readMatrix(std::istream& stream, std::size_t rows, std::size_t components) {
+Weights matrixIn(MappedStream& stream, std::size_t rows, std::size_t components) {
     const std::uint32_t cores = readCount(stream), dimensions = readCount(stream), size = readCount(stream);
     const std::uint32_t storedRows = readCount(stream), cols = readCount(stream);
     if (!stream || cores != 2 || dimensions != 8 || storedRows != rows || size != std::uint64_t{rows} * cols)
         return Weights(0, 0);
     if (cols != components) return Weights(0, cols);
-    const std::size_t stride = (rows + rowUnit - 1) / rowUnit * rowUnit;
-    Weights result(FNRMem<signed char>(largeBlock(std::max<std::size_t>(stride * cols, 1))), stride, cols);
-    signed char* column = result.getExclusive();
-    for (std::size_t c = 0; c < cols && stream; ++c, column += stride) {
-        stream.read(reinterpret_cast<char*>(column), static_cast<std::streamsize>(rows));
-        std::fill(column + rows, column + stride, static_cast<signed char>(0));
-    }
-    return stream ? result : Weights(0, 0);
+    const std::optional<FNRMemCore> weights = stream.take(size);
+    return weights ? Weights(FNRMem<signed char>(*weights), rows, cols) : Weights(0, 0);
 }
 
 } // namespace
 
 Transformation Transformation::read(const std::string& path, std::size_t rawSize, std::size_t components) {
-    std::ifstream stream(path, std::ios::binary);
-    if (!stream) FN_THROW(FNEIOError, "CmpAlgorithm: File '" + path + "' could not be opened for reading.");
+    MappedStream stream(FNCountedPtr<MappedFile>(new MappedFile(path)));
     const auto vector = [&](const char* before, std::size_t size) {
         return readPackage<FNVector<float>>(stream, path, before, "", size);
     };
     const float factor =
         readPackage<Factor>(stream, path, "float factor package reading file '", "'", 1).value;
-    const Weights matrix = readMatrix(stream, rawSize, components);
+    const Weights matrix = matrixIn(stream, rawSize, components);
     if (matrix.cols() != components && matrix.cols() != 0)
         FN_THROW(FNEIOError, "PCLD: incompatible number of vector components.  Matrix cols = " +
                                  std::to_string(matrix.cols()) +
@@ -108,19 +135,19 @@ Transformation Transformation::read(const std::string& path, std::size_t rawSize
 
 void Transformation::write(std::ostream& stream) const {
     Fn::Package(factor).write(stream);
-    const Weights unpadded = matrix.rows() == average.size()
-                                 ? matrix
-                                 : Weights(matrix, 0, 0, average.size() - 1, matrix.cols() - 1);
-    static_cast<Fn::Package>(unpadded).write(stream);
+    static_cast<Fn::Package>(matrix).write(stream);
     for (const FNVector<float>& vector : {average, translation, base})
         static_cast<Fn::Package>(vector).write(stream);
 }
 
 void Transformation::write(const std::string& path) const {
-    std::ofstream stream(path, std::ios::binary);
+    const std::string unfinished = path + ".part"; // what others have mapped stays as it is
+    std::ofstream stream(unfinished, std::ios::binary);
     write(stream);
     stream.close();
-    if (!stream) FN_THROW(FNEIOError, "Cannot write the transformation '" + path + "'");
+    std::error_code error;
+    if (stream) std::filesystem::rename(unfinished, path, error);
+    if (!stream || error) FN_THROW(FNEIOError, "Cannot write the transformation '" + path + "'");
 }
 
 } // namespace Cmp::B7

@@ -11,8 +11,8 @@ namespace Cmp::B7 {
 /// translation. Its file holds the factor, the matrix and the vectors as packages, one behind the other.
 struct Transformation {
     float factor;
-    /// A row for each raw component and rows of 0 up to a multiple of 16, a column for each component of a
-    /// feature.
+    /// A row for each raw component, a column for each component of a feature. As read() gives it, it lies in
+    /// the file, which may be replaced but not be written over as long as the matrix is used.
     Fn::Matrix<signed char> matrix;
     FNVector<float> average;     ///< of the raw vectors
     FNVector<float> translation; ///< added to features
@@ -26,9 +26,8 @@ struct Transformation {
     /// @param rawSize of raw vectors @param components of features
     /// @throws FNEIOError if the file cannot be opened or does not hold what it should
     static Transformation read(const std::string& path, std::size_t rawSize, std::size_t components);
-    /// Without the rows that fill up the matrix.
     void write(std::ostream& stream) const;
-    /// The same to a file. @throws FNEIOError
+    /// The same to a file, in place of what is there. @throws FNEIOError
     void write(const std::string& path) const;
 };
 

@@ -1,3 +1,4 @@
+#include "gallery_search.h"
 #include "recognition_tool.h"
 
 #include <gtest/gtest.h>
@@ -102,6 +103,55 @@ TEST_F(GalleryToolWithModels, PeopleOfAFolderTreeAreFound) {
     EXPECT_EQ(removed.status, 2);
     EXPECT_EQ(removed.complaints, "orbek: " + gallery + ": has no \"carl\"\n");
     EXPECT_EQ(ids(gallery), Ids{"bob"});
+}
+
+TEST_F(GalleryToolWithModels, ASearchInPartsFindsWhatOneInMemoryFinds) {
+    using namespace Orbek;
+    const ScratchFolder scratch;
+    const std::string file = scratch.file("g");
+    Configuration configuration(folder().file("b7.conf"));
+    const FIRBuilder builder(configuration);
+    std::vector<std::string> people;
+    for (const char* name : {"alice1", "bob1", "carl1", "erik1", "bob2"}) {
+        (void)record(scratch, name);
+        people.push_back(scratch.read(std::string(name) + ".fir"));
+    }
+    std::vector<Tool::GalleryFile::Entry> entries; // those of one person have the same scores
+    for (std::size_t i = 0; i < 2500; ++i) entries.push_back({std::to_string(i), people[i % 4]});
+    Tool::GalleryFile::create(file);
+    Tool::GalleryFile gallery(file);
+    (void)gallery.add(entries, Tool::GalleryFile::Present::Kept, builder);
+    (void)gallery.remove({"0", "7", "1023", "1024", "2001"});
+    change(file,
+           "UPDATE entry SET rowid = 9e18 WHERE id = '2499'; UPDATE entry SET rowid = -9e18 WHERE id = '9'");
+
+    const auto bytes = [](const std::string& text) {
+        return reinterpret_cast<const unsigned char*>(text.data());
+    };
+    const FIR probe = builder.build(bytes(people[4]), static_cast<unsigned int>(people[4].size()));
+    const std::string normalization = "ORBEK.ComparisonAlgorithm.AlgorithmVersion.B7.ScoreNormalization";
+    for (const char* choice : {"Disabled", "Enabled"}) {
+        configuration.setValue(normalization, choice);
+        const Configuration chosen = configuration;
+        Population all(chosen);
+        for (const std::string& id : gallery.ids()) {
+            const std::string& person = people[std::stoul(id) % 4];
+            all.append(builder.build(bytes(person), static_cast<unsigned int>(person.size())), id);
+        }
+        for (const unsigned int top : {1u, 700u, 3000u}) {
+            const auto expected = FacialMatchingEngine(chosen).bestMatches(probe, all, 0.0f, top);
+            const auto found = Tool::GallerySearch(chosen, 3).bestMatches(probe, gallery, 0.0f, top);
+            ASSERT_EQ(found.size(), std::min(top, 2495u)) << choice;
+            ASSERT_EQ(expected->size(), found.size()) << choice;
+            // The one that has no other to be compared with at once is rounded in another way.
+            EXPECT_TRUE(std::ranges::equal(*expected, found, [](const Match& a, const Match& b) {
+                return std::abs(a.score - b.score) < 1e-5f;
+            })) << choice;
+            Ids names;
+            for (const Match& match : found) names.insert(match.name);
+            EXPECT_EQ(names.size(), found.size()) << choice;
+        }
+    }
 }
 
 TEST_F(GalleryToolWithModels, HasAllThatAKilledImportTold) {

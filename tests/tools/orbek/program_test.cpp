@@ -57,6 +57,8 @@ TEST(OrbekToolWithModels, SaysWhatStopsIt) {
     };
     const Case cases[] = {
         {{}, "subcommand is required"},
+        {{"compute"}, "orbek: there is no command \"compute\"; see orbek --help"},
+        {{"gallery", "bake", a}, "there is no command \"bake\""},
         {{"find"}, "images is required"},
         {{"find", a, "--box", "1", "2", "3"}, "--box"},
         {{"find", a, "--config", "/no/such.conf"}, "orbek: /no/such.conf: "},

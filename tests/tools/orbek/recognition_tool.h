@@ -1,22 +1,14 @@
 #pragma once
 
-#include "cmp/b7_setup.h"
-#include "cmp/mapping_files.h"
 #include "program.h"
+#include "support/b7_setup.h"
 
 /// The commands that know people, with a comparison of random weights.
 class RecognitionToolWithModels : public B7Setup {
 protected:
     static void SetUpTestSuite() {
         B7Setup::SetUpTestSuite();
-        const auto write = [](const char* name, float first, float last, float xMax) {
-            const Fn::InvertibleFunction<float, float> mapping(FNVector<float>(std::vector{first, last}), 0,
-                                                               xMax);
-            Cmp::Implementation::writeMappingFile(mapping, folder().file(name));
-        };
-        write("smap-b7.dat", 0, 1, 4000);
-        write("farmap-b7.dat", 1, 0, 1);
-        write("frrmap-b7.dat", 0, 0.5f, 1);
+        writeMappings();
         const std::string b7 = "ORBEK.ComparisonAlgorithm.AlgorithmVersion.B7.";
         folder().write("b7.conf",
                        "ORBEK.Substitutions.INSTALLDIR = " ORBEK_BINARY_DIR "\n" + b7 +

@@ -2,6 +2,7 @@
 
 #include "cmp/b7/cmp_algorithm.h"
 #include "cmp/b7/core.h"
+#include "cmp/mapping_files.h"
 #include "fn/deployment/app_config_db.h"
 #include "support/scratch_folder.h"
 
@@ -35,6 +36,21 @@ protected:
             for (int i = 0; i < 8; ++i)
                 weights[c * raw + random() % raw] = static_cast<signed char>(random() % 255 - 127);
         t.write(folder_->file("trans-b7.dat"));
+    }
+    /// Mappings from raw scores up to 4000, normalized ones up to 10, to scores, and to rates: of false
+    /// acceptance down from 1, of false rejection up to 0.5.
+    static void writeMappings() {
+        const auto write = [](const std::string& name, float first, float last, float xMax) {
+            const Fn::InvertibleFunction<float, float> mapping(FNVector<float>(std::vector{first, last}), 0,
+                                                               xMax);
+            Cmp::Implementation::writeMappingFile(mapping, folder_->file(name));
+        };
+        write("smap-b7.dat", 0, 1, 4000);
+        write("smap-b7-sn.dat", 0, 1, 10);
+        for (const std::string names : {"b7.dat", "b7-sn.dat"}) {
+            write("farmap-" + names, 1, 0, 1);
+            write("frrmap-" + names, 0, 0.5f, 1);
+        }
     }
     static void TearDownTestSuite() {
         delete folder_;
