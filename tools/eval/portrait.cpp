@@ -45,7 +45,7 @@ PortraitReport emptyReport() {
              {"light of any frontal portrait", 0.75f},
              {"eyes open (pictures of eyes)", -0.67f},
              {"eye open (by the lids' points)", -0.67f},
-             {"gaze frontal (by the iris)", 0.5f},
+             {"gaze frontal (by both irises)", 0.5f},
              {"mouth closed", 0.5f},
              {"glasses", -0.8f},
              {"male, from 20 years on or of unknown age", 0},
@@ -110,28 +110,37 @@ private:
     void judgePoints(const Labelled::Row& row, const Labelled::Points68& points,
                      const FNImageReference& image) {
         constexpr float openMouth = 0.1f, closedEye = 0.13f, openEye = 0.26f;
-        constexpr float frontalIris = 0.08f, awayIris = 0.16f, straight = 12, turned = 20;
+        constexpr float straight = 12, turned = 20;
         const float yaw = std::abs(points.yaw());
         if (!row.number("pose") && (yaw < straight || yaw > turned))
             ask(frontal, -portrait_.deviationFromFrontalPose(), yaw < straight);
         ask(mouthClosed, portrait_.mouthClosed(), points.lipGap() <= openMouth);
-        const FNImage<float> gray = image.toMonoFloat();
         for (const Labelled::Side side : {Labelled::Side::left, Labelled::Side::right}) {
             // The values of eye0 are read from the right side of the portrait.
             const bool first = side == Labelled::Side::right;
             const float opening = points.eyeOpening(side);
             if (opening < closedEye || opening > openEye)
                 ask(eyeOpenByLids, first ? portrait_.eye0Open() : portrait_.eye1Open(), opening > openEye);
-            const float iris = std::abs(points.irisOffset(gray, side).value_or(2));
-            if (iris < frontalIris || (iris > awayIris && iris < 1))
-                ask(gazeFrontal, first ? portrait_.eye0GazeFrontal() : portrait_.eye1GazeFrontal(),
-                    iris < frontalIris);
         }
+        judgeGaze(points, image);
         const auto extent = points.extent(portrait_.eye0(), portrait_.eye1());
         const float d = portrait_.eyeDistance();
         measure(chin, portrait_.chin() / d, extent.chin);
         measure(earLeft, portrait_.ear0() / d, extent.left);
         measure(earRight, portrait_.ear1() / d, extent.right);
+    }
+
+    /// Where a single iris is seen is often wrong; what both tell is mostly right.
+    void judgeGaze(const Labelled::Points68& points, const FNImageReference& image) {
+        constexpr float ahead = 0.08f, away = 0.16f;
+        const FNImage<float> gray = image.toMonoFloat();
+        const auto left = points.irisOffset(gray, Labelled::Side::left),
+                   right = points.irisOffset(gray, Labelled::Side::right);
+        if (!left || !right) return;
+        const auto [nearer, farther] = std::minmax({std::abs(*left), std::abs(*right)});
+        if (farther < ahead || (nearer > away && *left * *right > 0))
+            ask(gazeFrontal, std::min(portrait_.eye0GazeFrontal(), portrait_.eye1GazeFrontal()),
+                farther < ahead);
     }
 
     const Characteristics& portrait_;

@@ -128,8 +128,9 @@ template <class T> T readNumber(std::istream& stream) {
 /// Fills sets, from the cache where it has them.
 class PortraitSampler {
 public:
-    explicit PortraitSampler(const TrainingSources& sources, const std::string& folder)
-        : sources_(sources), folder_(folder), features_(FNMutex()), random_(sources.seed) {
+    PortraitSampler(const TrainingSources& sources, const std::string& folder, PortraitViews views)
+        : sources_(sources), folder_(folder), further_(views == PortraitViews::further), features_(FNMutex()),
+          random_(sources.seed + (further_ ? 1 : 0)) {
         std::filesystem::create_directories(sources.cache);
         set_.rows = Labelled::readLabels(sources.data / folder / "labels.tsv");
     }
@@ -153,15 +154,18 @@ public:
             const auto left = row.position("eye_left"), right = row.position("eye_right");
             if (!left || !right || right->x - left->x < leastEyeDistance) continue;
             const Labelled::Split split = Labelled::splitOf(row.splitKey());
+            if (further_ && split != Labelled::Split::train) continue;
             const Eyes label{*left, *right, false};
             const FNImageReference image = Fn::readImage(row.image().string());
             const Eyes eyes = find(image, *left, *right), moved = jittered(label, random_);
             const bool twice = split == Labelled::Split::train;
             const Values iris = irisOffsets(row, image);
-            add({r, split, false, eyes.left, eyes.right, eyes.found}, faceOf(image, eyes), kinds, iris);
-            if (twice)
-                add({r, split, true, moved.left, moved.right, false}, mirroredFaceOf(image, moved), kinds,
-                    iris);
+            const auto face = [&](const Eyes& seen, bool mirrored) {
+                add({r, split, mirrored, seen.left, seen.right, seen.found},
+                    mirrored ? mirroredFaceOf(image, seen) : faceOf(image, seen), kinds, iris);
+            };
+            face(eyes, further_);
+            if (twice) face(moved, !further_);
         }
         writeCache();
     }
@@ -228,7 +232,8 @@ private:
     }
 
     std::filesystem::path file(const std::string& what) const {
-        std::string name = folder_ + "." + std::to_string(sources_.seed) + "." + what;
+        const std::string views = further_ ? ".further." : ".";
+        std::string name = folder_ + views + std::to_string(sources_.seed) + "." + what;
         std::replace(name.begin(), name.end(), '/', '-');
         return sources_.cache / name;
     }
@@ -289,6 +294,7 @@ private:
 
     TrainingSources sources_;
     std::string folder_;
+    bool further_; ///< views
     PortraitFeatures features_;
     Random random_;
     PortraitSet set_;
@@ -306,12 +312,12 @@ std::size_t PortraitSet::dimension(PortraitKind kind) const {
 
 PortraitSet loadPortraits(const TrainingSources& sources, const std::string& folder,
                           const std::vector<PortraitKind>& kinds, const std::vector<PortraitKind>& wanted,
-                          std::size_t most) {
-    return PortraitSampler(sources, folder).faces(kinds, wanted, most);
+                          PortraitViews views, std::size_t most) {
+    return PortraitSampler(sources, folder, views).faces(kinds, wanted, most);
 }
 
 PortraitSet loadEyePictures(const TrainingSources& sources, const std::string& folder) {
-    return PortraitSampler(sources, folder).eyePictures();
+    return PortraitSampler(sources, folder, PortraitViews::first).eyePictures();
 }
 
 } // namespace Train

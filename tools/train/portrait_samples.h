@@ -15,7 +15,8 @@ namespace Train {
 /// What discriminators of portraits learn from: feature vectors of labelled faces, extracted by the library.
 ///
 /// Each face is taken as our own finders see it (as it is labelled where they do not find it), and those of
-/// the train part a second time in a mirror, with the labelled eyes moved a little.
+/// the train part a second time in a mirror, with the labelled eyes moved a little. Further views of the
+/// train part are the other way round: what the finders see is mirrored, and what is moved is not.
 
 /// The feature vectors, and two things that labels are derived from.
 enum class PortraitKind {
@@ -32,6 +33,8 @@ enum class PortraitKind {
     iris      ///< offset of the iris in the left and right eye; beyond 1 if it is not seen
 };
 inline constexpr std::size_t portraitKinds = 11;
+
+enum class PortraitViews { first, further };
 
 struct PortraitSample {
     std::size_t row; ///< of the set
@@ -67,7 +70,7 @@ private:
 /// @param most rows at most, the others being left out evenly
 PortraitSet loadPortraits(const TrainingSources& sources, const std::string& folder,
                           const std::vector<PortraitKind>& kinds, const std::vector<PortraitKind>& wanted,
-                          std::size_t most = 1000000);
+                          PortraitViews views = PortraitViews::first, std::size_t most = 1000000);
 
 /// Vectors of single eyes, from pictures of one eye each; the same interface, kind closedEyes only. The eye
 /// is taken to be as large as it is on average.

@@ -146,9 +146,18 @@ public:
     }
 
 private:
-    const PortraitSet& set(const std::string& folder) {
-        const auto found = sets_.find(folder);
+    const PortraitSet& set(const std::string& folder, PortraitViews views = PortraitViews::first) {
+        const std::pair key(folder, views);
+        const auto found = sets_.find(key);
         if (found != sets_.end()) return found->second;
+        return sets_
+            .emplace(key, folder == "portraits/eyes"      ? loadEyePictures(sources_, folder)
+                          : views == PortraitViews::first ? firstViews(folder)
+                                                          : furtherViews(folder))
+            .first->second;
+    }
+
+    PortraitSet firstViews(const std::string& folder) const {
         static const std::map<std::string, std::vector<K>> kinds{
             {"portraits/light", {K::lighting}},
             {"video/webcam", {K::glasses}},
@@ -162,24 +171,29 @@ private:
             {"people/lfw", {K::pose, K::mouth, K::head, K::closedEyes, K::gazeAway, K::iris, K::gender}},
         };
         constexpr std::size_t all = 1000000, ofLfw = 4000;
-        return sets_
-            .emplace(folder, folder == "portraits/eyes"
-                                 ? loadEyePictures(sources_, folder)
-                                 : loadPortraits(sources_, folder, kinds.at(folder), wanted_,
-                                                 folder == "people/lfw" ? ofLfw : all))
-            .first->second;
+        return loadPortraits(sources_, folder, kinds.at(folder), wanted_, PortraitViews::first,
+                             folder == "people/lfw" ? ofLfw : all);
+    }
+
+    /// Of what the step wants only, and of all pictures.
+    PortraitSet furtherViews(const std::string& folder) const {
+        return loadPortraits(sources_, folder, wanted_, wanted_, PortraitViews::further);
     }
 
     /// Collects what `use(set, i, samples of the split)` adds.
     template <class Use>
-    Learning collect(const std::vector<std::string>& folders, std::size_t mostTrain, Use use) {
+    Learning collect(const std::vector<std::string>& folders, std::size_t mostTrain, Use use,
+                     bool withFurtherViews = false) {
         FloatSamples train, dev;
-        for (const std::string& folder : folders) {
-            const PortraitSet& portraits = set(folder);
+        const auto useAll = [&](const PortraitSet& portraits) {
             for (std::size_t i = 0; i < portraits.samples.size(); ++i) {
                 const Split split = portraits.samples[i].split;
                 if (split != Split::test) use(portraits, i, split == Split::train ? train : dev);
             }
+        };
+        for (const std::string& folder : folders) {
+            useAll(set(folder));
+            if (withFurtherViews) useAll(set(folder, PortraitViews::further));
         }
         return learningOf(std::move(train), dev, mostTrain, random_);
     }
@@ -268,17 +282,16 @@ private:
 
     void mouth() {
         const auto use = [](const PortraitSet& set, std::size_t i, FloatSamples& out) {
-            constexpr float open = 0.1f, unclear = 0.02f;
+            // Labels err by as much as the smallest gaps, so these count for little.
+            constexpr float open = 0.1f, clear = 0.05f;
             const auto points = Labelled::Points68::of(set.rowOf(i));
             if (!points) return;
-            const float gap = points->lipGap();
-            if (set.samples[i].split == Split::train && std::abs(gap - open) < unclear) return;
-            out.add(set.features(K::mouth, i), gap > open ? 1.0f : -1.0f);
+            out.add(set.features(K::mouth, i), std::clamp((points->lipGap() - open) / clear, -1.0f, 1.0f));
         };
         Learning learning =
-            collect({"portraits/mtfl", "scenes/faces", "people/celeba", "people/lfw"}, 14000, use);
+            collect({"portraits/mtfl", "scenes/faces", "people/celeba", "people/lfw"}, 24000, use, true);
         balance(learning.samples);
-        classifier("cmdisc.dat", learning, 24, {1}, {-0.5, 0.95, true, 1});
+        classifier("cmdisc.dat", learning, 96, {1}, {-0.5, 0.95, true, 1});
     }
 
     void closedEyes() {
@@ -585,7 +598,7 @@ private:
 
     /// By the picture that the features are of.
     std::size_t foldOf(const float* features) const {
-        for (const auto& [folder, set] : sets_) {
+        for (const auto& [key, set] : sets_) {
             const Span all = set.features(K::age, 0);
             const std::ptrdiff_t offset = features - all.data();
             const auto i = static_cast<std::size_t>(offset) / set.dimension(K::age);
@@ -636,8 +649,8 @@ private:
     TrainingSources sources_;
     std::filesystem::path folder_;
     std::mt19937_64 random_;
-    std::map<std::string, PortraitSet> sets_; ///< of the present step
-    std::vector<K> wanted_;                   ///< by the present step
+    std::map<std::pair<std::string, PortraitViews>, PortraitSet> sets_; ///< of the present step
+    std::vector<K> wanted_;                                             ///< by the present step
 };
 
 } // namespace
