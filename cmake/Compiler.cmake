@@ -20,5 +20,6 @@ endif()
 find_program(CCACHE ccache)
 if(CCACHE)
     set(CMAKE_C_COMPILER_LAUNCHER ${CCACHE})
-    set(CMAKE_CXX_COMPILER_LAUNCHER ${CCACHE})
+    # What it has to overlook to keep what is compiled with precompiled headers.
+    set(CMAKE_CXX_COMPILER_LAUNCHER ${CMAKE_COMMAND} -E env CCACHE_SLOPPINESS=pch_defines,time_macros ${CCACHE})
 endif()
