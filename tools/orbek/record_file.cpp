@@ -25,7 +25,7 @@ FIR readRecord(const FIRBuilder& builder, const std::string& file) {
     try {
         return builder.build(stream);
     } catch (const std::exception& e) {
-        throw UnreadableInput(file + ": " + e.what());
+        throw UnreadableInput(file + ": is not a record of this configuration (" + e.what() + ")");
     }
 }
 
