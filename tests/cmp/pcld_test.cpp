@@ -274,8 +274,7 @@ TEST(PCLD, RefusesRecordsThatAreNotItsOwn) {
              {Fn::Package(7.0), "FNEBadArg: "},
              {with(Fn::Package(1)), "FNEBadArg: "},
              {with(words(featureSize - 1)), "FNEBadArg: PCLD: loadFeatureSet: incompatible data: FIR 7.9 "
-                                            "GPyrRankNormNoPreprocL5: feature of "
-                                            "23 words instead of 24"},
+                                            "GPyrRankNormNoPreprocL5: feature of 23 words instead of 24"},
              {with(words(featureSize)), "nothing thrown"}})
         EXPECT_EQ(thrownBy([&p = package, &builder] { builder->create(p); }).substr(0, text.size()), text);
 }

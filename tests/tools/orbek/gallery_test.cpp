@@ -125,19 +125,17 @@ TEST_F(GalleryToolWithModels, ASearchInPartsFindsWhatOneInMemoryFinds) {
     change(file,
            "UPDATE entry SET rowid = 9e18 WHERE id = '2499'; UPDATE entry SET rowid = -9e18 WHERE id = '9'");
 
-    const auto bytes = [](const std::string& text) {
-        return reinterpret_cast<const unsigned char*>(text.data());
+    const auto recordOf = [&](const std::string& person) {
+        return builder.build(reinterpret_cast<const unsigned char*>(person.data()),
+                             static_cast<unsigned int>(person.size()));
     };
-    const FIR probe = builder.build(bytes(people[4]), static_cast<unsigned int>(people[4].size()));
+    const FIR probe = recordOf(people[4]);
     const std::string normalization = "ORBEK.ComparisonAlgorithm.AlgorithmVersion.B7.ScoreNormalization";
     for (const char* choice : {"Disabled", "Enabled"}) {
         configuration.setValue(normalization, choice);
         const Configuration chosen = configuration;
         Population all(chosen);
-        for (const std::string& id : gallery.ids()) {
-            const std::string& person = people[std::stoul(id) % 4];
-            all.append(builder.build(bytes(person), static_cast<unsigned int>(person.size())), id);
-        }
+        for (const std::string& id : gallery.ids()) all.append(recordOf(people[std::stoul(id) % 4]), id);
         for (const unsigned int top : {1u, 700u, 3000u}) {
             const auto expected = FacialMatchingEngine(chosen).bestMatches(probe, all, 0.0f, top);
             const auto found = Tool::GallerySearch(chosen, 3).bestMatches(probe, gallery, 0.0f, top);
