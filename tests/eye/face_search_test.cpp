@@ -76,6 +76,8 @@ TEST(OverlapRemoval, TheMoreConfidentOfTwoCloseFacesStays) {
     EXPECT_EQ(kept({0, 35.9f}, 0), 1u) << "1.8 along the face";
     EXPECT_EQ(kept({0, 36.1f}, 0), 2u);
     EXPECT_EQ(kept({31.9f, 0}, 1.5707963f), 1u) << "a lying face reaches further to the side";
+    EXPECT_EQ(kept({26.4f, 19.8f}, 0.5f), 1u) << "a turned one in the direction that is its height";
+    EXPECT_EQ(kept({-26.4f, 19.8f}, 0.5f), 2u);
     Locations equal;
     equal.insert({{10, 0}, 20, 1, 0});
     equal.insert({{11, 0}, 20, 1, 0});
