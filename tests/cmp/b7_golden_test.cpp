@@ -2,6 +2,8 @@
 
 #include "cmp/b7/preprocessor.h"
 #include "cmp/b7/reshape_warp.h"
+#include "cmp/b7/score_normalization.h"
+#include "cmp/b7/value_histogram.h"
 #include "fn/imagefile/image_file.h"
 #include "golden/golden_facts.h"
 
@@ -48,6 +50,50 @@ TEST(B7Golden, TurnsAPictureIntoTheVectorThatModelsWereTrainedOn) {
     }
     facts.number("points.x", x, 1e-9);
     facts.number("points.y", y, 1e-9);
+}
+
+TEST(B7Golden, ApproximatesDensitiesByChordsOfTheExponentialFunction) {
+    // With a deviation that makes the density the exponential function itself.
+    const auto density = [](double exponent) {
+        constexpr float deviation = 0.39894228f;
+        const auto x = static_cast<float>(std::sqrt(-2 * exponent)) * deviation;
+        return static_cast<double>(EM::linearApproxOfGaussDensity(x, 0.0f, deviation));
+    };
+    const double ends[] = {-0.1, -0.5, -1, -2, -3, -4, -6, -8, -10, -12, -14, -16, -18, -20};
+    EXPECT_NEAR(density(-0.04), 0.96, 1e-4) << "a tangent";
+    for (std::size_t i = 0; i + 1 < std::size(ends); ++i) {
+        const double middle = (ends[i] + ends[i + 1]) / 2, half = (ends[i] - ends[i + 1]) / 2;
+        EXPECT_NEAR(density(middle) / std::exp(middle), std::cosh(half), 2e-3) << middle;
+        for (const double end : {ends[i] - 0.001 * half, ends[i + 1] + 0.001 * half})
+            EXPECT_NEAR(density(end) / std::exp(end), 1, 4e-3) << end;
+    }
+    EXPECT_NEAR(density(-21) / std::exp(-21), 1, 1e-3) << "exactly";
+}
+
+TEST(B7Golden, NormalizesTheScoresOfSearchesAsItDid) {
+    GoldenFacts facts("b7_normalization");
+    // Scores of others about a mean, and of the person that is looked for above them, if there are any.
+    const auto tell = [&](const std::string& name, double mean, double deviation, double others, double own) {
+        Cmp::ScoreHistogram histogram(rawScoreBins);
+        for (unsigned int i = 0; i < rawScoreBins; ++i) {
+            const double score = rawScoreMin + (i + 0.5) * static_cast<double>(rawScoreBinWidth);
+            const double a = (score - mean) / deviation, b = (score - mean - 8 * deviation) / deviation;
+            histogram.getExclusive()[i] =
+                static_cast<unsigned int>(others * std::exp(-a * a / 2) + own * std::exp(-b * b / 2));
+        }
+        Cmp::RawMatches matches;
+        for (const float score : {-100.0f, 0.0f, 40.0f, 250.0f})
+            matches.emplace(score, std::to_string(score));
+        for (const Cmp::RawMatch& match : normalizeRawScores(matches, histogram))
+            facts.number(name + "." + match.id, 1000 * static_cast<double>(match.score), 1e-3);
+    };
+    tell("usual", 0, 5, 20000, 300);
+    tell("few", 0, 5, 200, 1);
+    tell("strangers", 3, 4, 20000, 0);
+    tell("wide", -20, 20, 5000, 500);
+    tell("high", 30, 6, 9000, 2000);
+    tell("alike", 10, 1, 100000, 3);
+    tell("nobody", 0, 5, 0, 0);
 }
 
 } // namespace
