@@ -93,9 +93,7 @@ private:
             foundSecond = give(found_.right, second);
             const auto time = Fn::getImageCaptureTime(image.attributes());
             if (!time.isSet()) return;
-            const FNPos moved =
-                found_.speed *
-                std::chrono::duration<float>(time->sinceEpoch()).count();
+            const FNPos moved = found_.speed * std::chrono::duration<float>(time->sinceEpoch()).count();
             first.pos += moved;
             second.pos += moved;
         }
