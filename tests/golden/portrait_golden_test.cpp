@@ -61,8 +61,7 @@ constexpr Measure<Characteristics> colourMeasures[] = {
     {"naturalSkinColour", &Characteristics::naturalSkinColour},
 };
 
-/// In the order in which a summary lists them; the first three letters of a digit string's place tell which
-/// one it is.
+/// A digit for each, in this order.
 constexpr bool (Compliance::*judgements[])() const = {
     &Compliance::isCompliant,
     &Compliance::isBestPractice,
@@ -234,6 +233,35 @@ TEST(PortraitGoldenWithModels, MeasuresAndJudgesAsItDid) {
         painting->paint(paint);
         tellPortrait(facts, name, analyzer.analyze({image, plain.eyes}), configuration);
     }
+}
+
+/// Gray pixels of an application.
+class GrayImage final : public ImageBody {
+public:
+    explicit GrayImage(const Image& image) : image_(image) {}
+    bool isColor() const override { return false; }
+    unsigned int width() const override { return image_->width(); }
+    unsigned int height() const override { return image_->height(); }
+    const unsigned char* grayScaleRepresentation() const override {
+        return image_->grayScaleRepresentation();
+    }
+    const Rgb* colorRepresentation() const override { return image_->colorRepresentation(); }
+    std::string name() const override { return "gray"; }
+
+private:
+    Image image_;
+};
+
+TEST(PortraitGoldenWithModels, MeasuresGrayPicturesAsItDid) {
+    GoldenFacts facts("gray");
+    const Configuration configuration = configured();
+    const Placed plain = placed(configuration, drawnPerson("plain"));
+    const std::pair<Image, Eyes::Location> gray(Image(new GrayImage(plain.image)), plain.eyes);
+    const Portrait::Analyzer analyzer(configuration);
+    EXPECT_FALSE(analyzer.analyze(gray).isColor());
+    EXPECT_TRUE(analyzer.analyzeColor(gray).isColor());
+    tellPortrait(facts, "gray", analyzer.analyze(gray), configuration);
+    tellPortrait(facts, "as colours", analyzer.analyzeColor(gray), configuration);
 }
 
 TEST(PortraitGoldenWithModels, HasTheLimitsThatItHad) {
