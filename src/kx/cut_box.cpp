@@ -43,7 +43,7 @@ int pictureSide(float pixels) {
 }
 
 void CutBox::checkSize() const {
-    if (std::int64_t{width} * height > std::int64_t{Fn::ImageLimits().maxPixels})
+    if (static_cast<std::uint64_t>(width) * static_cast<std::uint64_t>(height) > Fn::ImageLimits().maxPixels)
         FN_THROW(FNEBadArg, "Failed to cut out a face: a picture of " + std::to_string(width) + " x " +
                                 std::to_string(height) + " pixels is too large");
 }

@@ -104,6 +104,8 @@ TEST(EvidenceFrame, CropsComeBackAtTheirPlaces) {
         EXPECT_EQ(read.img(true)->native(), FNImageReference::BGRA32);
         const Cmp::Face crop = read.getFaceForID("a", Evidence::Frame::CROPPED);
         EXPECT_EQ(crop.image().w(), 36u);
+        EXPECT_EQ(crop.image().h(), 50u);
+        EXPECT_NEAR(crop.facePosition().y, 50.7f - 31, 1e-4);
         EXPECT_NEAR(crop.facePosition().x, 60.3f - 42, 1e-4);
         const Cmp::Face thumb = read.getFaceForID("a", Evidence::Frame::THUMBNAIL);
         EXPECT_EQ(thumb.image().h(), 70u);
@@ -113,6 +115,50 @@ TEST(EvidenceFrame, CropsComeBackAtTheirPlaces) {
     check(noise<unsigned char>(200, 150));
     check(noise<unsigned short>(200, 150));
     check(noise<Fn::Bgra32>(200, 150));
+}
+
+TEST(EvidenceFrame, KeepsHowItsImagesAreWritten) {
+    using Reference = FNImageReference;
+    const Evidence::Frame plain = frame({face("a", 100, 75)}, 3);
+    EXPECT_EQ(plain.getImageCompressionMethod(), Reference::UNCOMPRESSED_RAW);
+    EXPECT_EQ(plain.getThumbnailFormat().height, 70);
+    EXPECT_EQ(plain.getThumbnailFormat().strategy, Reference::UNCOMPRESSED_RAW);
+    const auto sizeOf = [](const Evidence::Frame& f) {
+        const FNImageReference crop = f.getFaceForID("a", Evidence::Frame::CROPPED).image();
+        return std::pair(crop.w(), crop.h());
+    };
+    EXPECT_EQ(sizeOf(plain), std::pair(36u, 50u));
+
+    for (const bool whole : {false, true}) {
+        Evidence::Frame made = frame({face("a", 100, 75), face("b", 50, 75)}, 3, whole);
+        const Evidence::Frame::FaceInfos both = made.faceInfos();
+        EXPECT_EQ(sizeOf(made), std::pair(36u, 50u));
+        made.setCroppingFactor(1.5f); // of crops that are there already
+        EXPECT_EQ(sizeOf(made), std::pair(54u, 75u));
+        made.setImageCompressionMethod(Reference::COMPRESSED_PNG);
+        made.setThumbnailFormat({40, Reference::COMPRESSED_JPEGLS});
+        Evidence evidence("e");
+        evidence.push_back(frame({face("b", 50, 75)}, 2, whole));
+        evidence.push_back(made);
+        for (const Evidence::Frame& f : {made, evidence.getReduced(1)[1]}) {
+            EXPECT_EQ(f.getImageCompressionMethod(), Reference::COMPRESSED_PNG);
+            EXPECT_EQ(f.getThumbnailFormat().height, 40);
+            EXPECT_EQ(f.getThumbnailFormat().strategy, Reference::COMPRESSED_JPEGLS);
+            EXPECT_EQ(f.getSerializeWholeFrame(), whole);
+            EXPECT_EQ(f.timeStamp(), at(3));
+            const Cmp::Face crop = f.getFaceForID("a", Evidence::Frame::CROPPED),
+                            thumb = f.getFaceForID("a", Evidence::Frame::THUMBNAIL);
+            EXPECT_EQ(crop.image().getSerializationStrategy(), Reference::COMPRESSED_PNG);
+            EXPECT_EQ(thumb.image().getSerializationStrategy(), Reference::COMPRESSED_JPEGLS);
+            EXPECT_EQ(thumb.image().h(), 40u);
+        }
+        EXPECT_EQ(evidence.getReduced(1)[1].faceInfos().size(), 1u) << "of b the first only";
+        EXPECT_EQ(evidence.getReduced(1)[1].img(false)->w(), 200u);
+    }
+    Evidence::Frame gray = frame({face("a", 100, 75)}, 3, true);
+    gray.setImageCompressionMethod(Reference::COMPRESSED_PNG);
+    EXPECT_EQ(gray.img(true)->getSerializationStrategy(), Reference::COMPRESSED_PNG);
+    EXPECT_EQ(gray.img(false)->native(), Reference::BGRA32) << "kept in colour";
 }
 
 /// A frame of two crops of 2 by 2 pixels whose ids are given, the second one shifted by (1, 1).

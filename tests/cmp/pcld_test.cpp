@@ -10,6 +10,7 @@
 
 #include <gtest/gtest.h>
 
+#include <bit>
 #include <cmath>
 #include <limits>
 #include <numbers>
@@ -105,6 +106,46 @@ TEST(GaborPyrRankNormProcessor, IsThePlainForm) {
         EXPECT_LE(different, 4);
     }
     EXPECT_THROW(GaborPyrRankNormProcessor(l5Params('x'))(randomImage(80, 79, 1)), FNEBadArg);
+}
+
+TEST(RankTables, AreTheTrainedOnes) {
+    // Moments of the tables as they were published with the transformations.
+    const struct {
+        const std::array<float, rankTableSize>& table;
+        double sum, first, second;
+    } cases[] = {{rankTableX, 4.519202080, 113.390265950, 4712.908909430},
+                 {rankTableZ, 3.357742410, 81.969384750, 3357.324445090}};
+    for (const auto& c : cases) {
+        double sum = 0, first = 0, second = 0;
+        for (std::size_t i = 0; i < c.table.size(); ++i) {
+            const double v = c.table[i], k = static_cast<double>(i);
+            sum += v;
+            first += k * v;
+            second += k * k * v;
+        }
+        EXPECT_NEAR(sum, c.sum, 1e-7);
+        EXPECT_NEAR(first, c.first, 1e-5);
+        EXPECT_NEAR(second, c.second, 1e-3);
+    }
+}
+
+TEST(L5Face, HasTheEyesInTheirRow) {
+    for (const bool vertical : {false, true}) {
+        FNImage<float> ramp(160, 140); // each pixel is its place
+        for (std::uint32_t i = 0; i < ramp.size(); ++i)
+            ramp.getExclusive()[i] = static_cast<float>(vertical ? i / ramp.w() : i % ramp.w()) + 0.5f;
+        const FNImageReference image = FNImageReferenceFactory::create(ramp);
+        const FNImage<float> same = l5Face(image, {54, 60}, {86, 60}),
+                             half = l5Face(image, {60, 60}, {76, 60});
+        ASSERT_EQ(same.w(), 80u);
+        ASSERT_EQ(same.h(), 80u);
+        // The left eye comes to (24, 29.333334), the right one to (56, 29.333334).
+        for (const auto& [x, y] : {std::pair{10u, 20u}, {24u, 29u}, {60u, 70u}}) {
+            const double right = x + 0.5 - 24, down = y + 0.5 - 29.333334;
+            EXPECT_NEAR(same(x, y), vertical ? 60 + down : 54 + right, 1e-3);
+            EXPECT_NEAR(half(x, y), vertical ? 60 + down / 2 : 60 + right / 2, 1e-3);
+        }
+    }
 }
 
 TEST(GaborPyrProcessor, MagnitudesAreThoseOfFullTransforms) {
@@ -249,6 +290,31 @@ TEST(PCLD, RecordsKeepTheirFormAndTheirScores) {
     EXPECT_EQ(builder->dumpSize(), enrol(algorithm, {1, 2, 3, 4, 5, 6, 7}).serialize().size());
     EXPECT_TRUE(algorithm.merge({}, a).serialize() == a.serialize());
     EXPECT_EQ(algorithm.merge({a, b}, a).mementoSize(), 4 + 4 * 4 * (3 + featureSize));
+}
+
+TEST(PCLD, ACentreMovesByWhatIsMoreThanRounding) {
+    const L5 l5;
+    const PCLD algorithm = l5.algorithm("X.MaxNumOfClusters = 1\n");
+    const Cmp::RecordBuilder builder = algorithm.createRecordBuilder();
+    /// A record of the unit vector at that angle in the plane of the first two components.
+    const auto record = [&](double angle) {
+        FNVector<int> words(featureSize, 0);
+        words[0] = std::bit_cast<int>(static_cast<float>(std::cos(angle)));
+        words[1] = std::bit_cast<int>(static_cast<float>(std::sin(angle)));
+        return builder->create(Fn::Package(std::list<Fn::Package>{
+            Fn::serialize<std::string>("FIR 7.9 GPyrRankNormNoPreprocL5::RefSet"),
+            Fn::Package(std::list<Fn::Package>{Fn::Package(0.0f), Fn::Package(1.0f), Fn::Package(1.0f),
+                                               Fn::serialize(words)})}));
+    };
+    const Cmp::FIR first = record(0);
+    for (const auto& [distance, moves] : {std::pair{1.1e-5, false}, {1.3e-5, true}}) {
+        const double angle = 2 * std::acos(1 - distance); // the mean of both is at half of it
+        EXPECT_EQ(algorithm.merge({first}, record(angle)).serialize() == first.serialize(), !moves)
+            << distance;
+    }
+    EXPECT_EQ(algorithm.merge({first, record(1)}, record(2)).mementoSize(), first.mementoSize())
+        << "one cluster";
+    EXPECT_TRUE(algorithm.sampleRequirements() == (Cmp::Sample::Requirements{true, true}));
 }
 
 TEST(PCLD, RefusesRecordsThatAreNotItsOwn) {

@@ -12,6 +12,10 @@
 
 #include <gtest/gtest.h>
 
+#include <atomic>
+#include <map>
+#include <thread>
+
 namespace Orbek {
 namespace {
 
@@ -327,6 +331,78 @@ TEST_F(ProcessorsWithModels, ADeviceThatFailsSaysWhy) {
               }),
               reason);
     EXPECT_EQ(calls.text, "start start start ");
+}
+
+/// Plays drawn sample people.
+CaptureDevice film(const std::string& person) {
+    std::string names, files;
+    for (const std::string number : {"1", "2", "3"}) {
+        names += " p" + number;
+        files += "ORBEK.CaptureDevices.Files.ImageFiles.FileLocation.Files.p" + number +
+                 " = " ORBEK_SOURCE_DIR "/examples/images/" + person + number + ".jpg\n";
+    }
+    std::istringstream text("ORBEK.CaptureDevices.Files.ImageFiles.FileLocation.Files =" + names + "\n" +
+                            files);
+    return createCaptureDevice(Configuration(text), "Files");
+}
+
+TEST_F(ProcessorsWithModels, PeopleBeforeACameraAreEnrolledAndKnownAgain) {
+    std::istringstream text("ORBEK.Substitutions.INSTALLDIR = " ORBEK_BINARY_DIR "\n"
+                            "ORBEK.StreamEnroller.NumOfAcquisitions = 2\n"
+                            "ORBEK.StreamEnroller.MinImageTime = 0\n"
+                            "ORBEK.StreamVerifier.MaxNumOfImages = 2\n"
+                            "ORBEK.StreamVerifier.ImagePeriod = 1\n"
+                            "ORBEK.StreamIdentifier.TotalTime = 0\n");
+    const Configuration c(text);
+    /// What was told, with the eyes' places left out.
+    const auto plain = [](const Calls& calls) {
+        std::istringstream words(calls.text);
+        std::string result;
+        for (std::string word; words >> word;) result += (word.starts_with("eyes") ? "eyes" : word) + " ";
+        return result;
+    };
+    Population people(c);
+    std::map<std::string, FIR> firs;
+    for (const std::string name : {"alice", "bob"}) {
+        Calls calls;
+        Enrollment::Processor(c).process(film(name), enrollment(calls));
+        ASSERT_EQ(plain(calls), "start image eyes image eyes success end ");
+        firs.insert({name, calls.firs.at(0)});
+        people.append(calls.firs.at(0), name);
+    }
+    constexpr float threshold = 0.9f;
+    Calls same, other, known;
+    Verification::Processor(c).process(film("bob"), firs.at("bob"), threshold, verification(same));
+    EXPECT_EQ(plain(same), "start image eyes score match end ");
+    Verification::Processor(c).process(film("bob"), firs.at("alice"), threshold, verification(other));
+    EXPECT_EQ(plain(other), "start image eyes score image eyes score noMatch end ");
+    Identification::Processor(c, people).process(film("bob"), threshold, identification(known), 2);
+    EXPECT_EQ(plain(known), "start image eyes matches:bob end ");
+}
+
+TEST_F(ProcessorsWithModels, ThreadsOnOneProcessorTakeTurns) {
+    const Configuration c = configuration();
+    const Enrollment::Processor processor(c);
+    const std::list<Sample> samples{person(1), Sample(grayPattern(60, 50))};
+    std::atomic<int> inside = 0, met = 0;
+    const auto enrol = [&](Enrollment::Processor copy) {
+        for (int i = 0; i < 5; ++i) {
+            Calls calls;
+            calls.atEach = [&](const std::string& now) {
+                if (now == "start" && ++inside > 1) ++met;
+                std::this_thread::yield();
+                if (now == "end") --inside;
+            };
+            copy.process(samples.begin(), samples.end(), enrollment(calls));
+            EXPECT_EQ(calls.text, "start image eyes50 image blind success end ");
+            EXPECT_EQ(calls.images.size(), 2u);
+            EXPECT_EQ(calls.images.at(0), samples.front().image);
+        }
+    };
+    std::vector<std::thread> threads;
+    for (int t = 0; t < 3; ++t) threads.emplace_back(enrol, processor);
+    for (std::thread& thread : threads) thread.join();
+    EXPECT_EQ(met, 0);
 }
 
 class ProcessorsOnPhotos : public ProcessorsWithModels {};
