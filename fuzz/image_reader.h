@@ -8,8 +8,8 @@
 
 #include <cstdlib>
 
-/// Feeds `data` to a reader of image files: it gives an image within small limits, or throws one of our
-/// exceptions.
+/// Feeds `data` to a reader of image files, without and with rare variants: it gives an image within small
+/// limits, or throws one of our exceptions.
 template <class Read> int fuzzImageReader(const unsigned char* data, std::size_t size, Read read) {
     struct Silence final : FNDialog::Body {
         void log(const std::string&) override {}
@@ -22,12 +22,15 @@ template <class Read> int fuzzImageReader(const unsigned char* data, std::size_t
     Fn::ImageLimits limits;
     limits.maxPixels = 1u << 18;
     limits.maxBytes = 1u << 24;
-    Fn::MemoryStream stream(reinterpret_cast<const char*>(data), size);
-    try {
-        const FNImageReference image =
-            read(static_cast<std::istream&>(stream), Fn::ReadImagePropertiesFeedback(), limits);
-        if (!silent || std::uint64_t{image.w()} * image.h() > limits.maxPixels) std::abort();
-    } catch (const FNException&) {
+    for (const bool rareVariants : {false, true}) {
+        limits.rareVariants = rareVariants;
+        Fn::MemoryStream stream(reinterpret_cast<const char*>(data), size);
+        try {
+            const FNImageReference image =
+                read(static_cast<std::istream&>(stream), Fn::ReadImagePropertiesFeedback(), limits);
+            if (!silent || std::uint64_t{image.w()} * image.h() > limits.maxPixels) std::abort();
+        } catch (const FNException&) {
+        }
     }
     return 0;
 }

@@ -1,11 +1,11 @@
 #include "orbek/image_io.h"
 
 #include "fn/imagefile/bmp.h"
-#include "fn/imagefile/byte_stream.h"
 #include "fn/imagefile/image_file.h"
 #include "fn/imagefile/j2k.h"
 #include "fn/imagefile/jpeg.h"
 #include "fn/imagefile/png.h"
+#include "fn/whole_file.h"
 #include "orbek/implementation/adapt.h"
 
 namespace Orbek {
@@ -68,8 +68,7 @@ void save(const Image& image, std::ostream& stream, int quality) {
 }
 
 void save(const Image& image, const std::string& fileName, int quality) {
-    std::ofstream stream = Fn::openForWriting(fileName);
-    save(image, stream, quality);
+    Fn::writeWholeFile(fileName, [&](std::ostream& stream) { save(image, stream, quality); });
 }
 
 SizeAndQuality saveWithSizeConstraint(const Image& image, std::ostream& stream, int maxBytes) {
@@ -119,6 +118,10 @@ Image load(std::istream& stream, const PropertiesFeedback& feedback) {
 
 void save(const Image& image, std::ostream& stream, int level) {
     Fn::writePng(adapt(image), stream, level);
+}
+
+void save(const Image& image, const std::string& fileName, int level) {
+    Fn::writeWholeFile(fileName, [&](std::ostream& stream) { save(image, stream, level); });
 }
 
 } // namespace Png

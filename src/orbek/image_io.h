@@ -137,6 +137,7 @@ Image load(const std::string& fileName, const PropertiesFeedback& feedback = noF
 Image load(std::istream& stream, const PropertiesFeedback& feedback = noFeedback());
 /// @param level of compression: 0 (none) to 9 (best), negative for the usual one
 void save(const Image& image, std::ostream& stream, int level);
+void save(const Image& image, const std::string& fileName, int level = -1);
 
 } // namespace gnu::visibility("default")]]Png
 

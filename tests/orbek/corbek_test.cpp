@@ -203,6 +203,20 @@ TEST_F(CInterfaceWithModels, RecordsAreMergedAndRatesTold) {
     complaintOf([&] { EXPECT_EQ(orbekRequestFAR(0, nullptr), 1); });
 }
 
+TEST_F(CInterfaceWithModels, EyesOutsideOfThePictureMakeNoRecord) {
+    unsigned int size = 0;
+    const auto generate = [&](float dx, float dy) {
+        return orbekGenerateFIR(alice.data(), alice.size(), alice.x0 + dx, alice.y0 + dy, alice.x1 + dx,
+                                alice.y1 + dy, nullptr, 0, &size);
+    };
+    EXPECT_EQ(generate(20, 20), 3) << "a record without room for it";
+    for (const float away : {400.0f, 1e4f, 1e6f, 1e9f})
+        for (const float sign : {-1.0f, 1.0f}) {
+            EXPECT_EQ(generate(sign * away, 0), 2) << sign * away;
+            EXPECT_EQ(generate(0, sign * (away + 200)), 2) << sign * away;
+        }
+}
+
 TEST_F(CInterfaceWithModels, EyesAreFoundOrLeftAlone) {
     Picture found{alice.jpeg, -1, -2, -3, -4};
     const auto find = [&](const std::string& jpeg) {

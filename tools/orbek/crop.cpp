@@ -42,6 +42,7 @@ std::vector<fs::path> outputFiles(const std::string& output, const std::vector<f
     if (sources.size() != 1)
         throw std::runtime_error(output + ": one file for " + std::to_string(sources.size()) +
                                  " pictures; give a folder");
+    refuseInputs({output}, sources);
     return {output};
 }
 

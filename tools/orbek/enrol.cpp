@@ -4,6 +4,7 @@
 #include "configuration_file.h"
 #include "enrolment.h"
 #include "record_file.h"
+#include "whole_file.h"
 
 #include <memory>
 
@@ -17,6 +18,7 @@ struct EnrolOptions : CommonOptions {
 
 int enrol(const EnrolOptions& options) {
     const std::vector<std::filesystem::path> files = pictureFiles(options.images);
+    refuseInputs({options.record}, files);
     const Enrollment::Processor processor(openConfiguration(options.configuration));
     Output output(options, files.size());
     const std::optional<FIR> record = enrolPictures(processor, files, output);

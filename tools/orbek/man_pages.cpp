@@ -1,9 +1,10 @@
 // orbek man-pages: what --help tells, as pages for man. The build runs it; people need not see it.
 
 #include "command.h"
+#include "whole_file.h"
 
 #include <filesystem>
-#include <fstream>
+#include <sstream>
 #include <memory>
 
 namespace Orbek::Tool {
@@ -79,7 +80,7 @@ void writeCommands(const CLI::App& app, std::ostream& page) {
 void writePages(const CLI::App& app, const std::filesystem::path& folder) {
     const std::string name = fullName(app, '-');
     const std::filesystem::path file = folder / (name + ".1");
-    std::ofstream page(file);
+    std::ostringstream page;
     page << ".TH " << shown(name) << " 1 \"\" orbek \"Face recognition\"\n"
          << ".SH NAME\n"
          << shown(name) << " \\- " << shown(firstLine(app.get_description())) << "\n";
@@ -89,7 +90,7 @@ void writePages(const CLI::App& app, const std::filesystem::path& folder) {
     writeOptions(app, page);
     if (const CLI::App* const parent = app.get_parent())
         page << ".SH SEE ALSO\n.BR " << shown(fullName(*parent, '-')) << " (1)\n";
-    if (!page.flush()) throw std::runtime_error(file.string() + ": cannot be written");
+    writeWhole(file.string(), page.str());
     for (const CLI::App* command : below(app)) writePages(*command, folder);
 }
 

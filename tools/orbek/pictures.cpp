@@ -2,8 +2,10 @@
 
 #include "fn/imagefile/image_file.h"
 #include "fn/imagefile/jpeg.h"
+#include "fn/whole_file.h"
 #include "img/affine/turns.h"
 #include "orbek/implementation/adapt.h"
+#include "whole_file.h"
 
 #include <algorithm>
 #include <array>
@@ -170,13 +172,12 @@ PictureFolder::PictureFolder(const std::string& folder, const std::vector<fs::pa
         for (int i = 2; !taken.insert(name).second; ++i) name = stem + "-" + std::to_string(i);
         names_.push_back(fs::path(folder) / (name + ".jpg"));
     }
+    refuseInputs(names_, sources);
 }
 
 void PictureFolder::write(std::size_t source, const FNImageReference& picture) const {
-    std::error_code ignored;
-    std::ofstream file(names_[source], std::ios::binary);
-    if (!file) throw std::runtime_error("Cannot write " + names_[source].string());
-    Fn::writeJpeg(picture, file, drawnQuality);
+    Fn::writeWholeFile(names_[source].string(),
+                       [&](std::ostream& file) { Fn::writeJpeg(picture, file, drawnQuality); });
 }
 
 } // namespace Orbek::Tool

@@ -76,10 +76,10 @@ class PictureFolder {
 public:
     /// Makes the folder, and a JPEG name in it for each source: its own without the ending, and a number if
     /// that is taken.
-    /// @throws std::runtime_error if it cannot be made
+    /// @throws std::runtime_error if it cannot be made, or a name in it is that of a source
     PictureFolder(const std::string& folder, const std::vector<std::filesystem::path>& sources);
 
-    /// Writes the picture that was drawn for a source. @throws std::runtime_error naming the file
+    /// Writes the picture that was drawn for a source. @throws std::exception naming the file
     void write(std::size_t source, const FNImageReference& picture) const;
 
     /// The names for all sources.

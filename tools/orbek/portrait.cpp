@@ -7,6 +7,7 @@
 #include "pictures.h"
 #include "portrait_page.h"
 #include "prominent_eyes.h"
+#include "whole_file.h"
 
 #include <array>
 #include <memory>
@@ -97,6 +98,7 @@ std::string textOf(const std::string& file, const AssessedPortrait& a) {
 
 int portrait(const PortraitOptions& options) {
     const std::vector<std::filesystem::path> files = pictureFiles(options.images);
+    if (!options.report.empty()) refuseInputs({options.report}, files);
     const Assessor assessor(openConfiguration(options.configuration));
     const bool reported = !options.report.empty();
     PortraitPage page;

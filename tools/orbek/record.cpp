@@ -37,6 +37,7 @@ struct ReadOptions : CommonOptions {
 
 int write(const WriteOptions& options) {
     const std::vector<fs::path> files = pictureFiles(options.images);
+    refuseInputs({options.record}, files);
     const Configuration configuration = openConfiguration(options.configuration);
     const ProminentEyes eyes(configuration);
     const TokenFace::Creator creator(configuration);
@@ -99,6 +100,7 @@ int read(const ReadOptions& options) {
             // Without a further loss.
             constexpr int level = 6;
             const std::string file = (fs::path(options.folder) / (std::to_string(number) + ".png")).string();
+            refuseInputs({file}, {options.record});
             std::ostringstream png;
             Png::save(image, png, level);
             writeWhole(file, png.str());

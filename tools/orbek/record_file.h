@@ -13,7 +13,7 @@ namespace Orbek::Tool {
 
 /// @throws UnreadableInput naming the file and what is wrong with it
 FIR readRecord(const FIRBuilder& builder, const std::string& file);
-/// Writes the whole file or, if that fails, none. @throws std::runtime_error naming the file
+/// Writes the whole file or, if that fails, none. @throws std::exception naming the file and the reason
 void writeRecord(const FIR& record, const std::string& file);
 
 std::uint32_t numberOfFeatures(const FIR& record);

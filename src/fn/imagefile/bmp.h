@@ -8,12 +8,12 @@
 #include <iosfwd>
 #include <vector>
 
-/// Windows bitmaps with a header of 40 bytes, as files and as what capture devices deliver. Own reader and
-/// writer.
+/// Windows bitmaps, as files and as what capture devices deliver. Own reader and writer.
 
 namespace Fn {
 
-/// The header BITMAPINFOHEADER behind its size, in stored order.
+/// The header BITMAPINFOHEADER behind its size, in stored order. Later headers, of 52 to 124 bytes, begin with
+/// it; masks of red, green, blue and alpha follow, and what tells of colour spaces.
 struct BitmapInfo {
     std::int32_t width;
     std::int32_t height; ///< negative: rows lie top to bottom
@@ -50,6 +50,7 @@ struct Bitmap {
     BitmapInfo info;
     std::vector<unsigned char> colorTable; ///< entries of blue, green, red, 0; or three masks of 4 bytes
     std::vector<unsigned char> pixels;
+    std::uint32_t alphaMask = 0; ///< with three masks: of the alpha; 0 if all is opaque
 
     BitmapCoding coding() const { return static_cast<BitmapCoding>(info.compression & 0x7F7F7F7F); }
     std::uint32_t w() const { return static_cast<std::uint32_t>(info.width); }
@@ -70,9 +71,11 @@ FNImage<unsigned char> bmp2ByteImg(const Bitmap& bitmap);
 FNImage<Bgra32> bmp2ColorImg(const Bitmap& bitmap);
 
 /// Reads a file. 8 bits without a colour table of their own, "Y800" and "Y8  " give mono8, all else bgra32.
-/// The first two bytes are not looked at.
-/// @throws FNESysError for a header of another size; FNEIOError if the stream ends too early; what the
-/// conversions throw.
+/// The first two bytes are not looked at. The pixels begin where the file header tells, unless that is within
+/// the headers or the colour table; then they follow these. Rare variants are RLE4, RLE8 and later headers than
+/// that of 40 bytes.
+/// @throws FNESysError for a header of another size; FNEBadArg for an unknown coding; FNEIOError if the stream
+/// ends too early; what the conversions throw.
 FNImageReference readBMP(std::istream& stream, const ReadImagePropertiesFeedback& feedback = {},
                          const ImageLimits& limits = {});
 /// @throws FNEIOError if the file cannot be opened.

@@ -74,7 +74,8 @@ std::array<std::uint32_t, 3> storedMasks(const Bitmap& bitmap) {
 /// `bytesPerPixel` is 2 or 4.
 template <unsigned bytesPerPixel>
 FNImage<Bgra32> maskedColors(const Bitmap& bitmap, const std::array<std::uint32_t, 3>& masks) {
-    const MaskedChannel red(masks[0]), green(masks[1]), blue(masks[2]);
+    const MaskedChannel red(masks[0]), green(masks[1]), blue(masks[2]), alpha(bitmap.alphaMask);
+    const bool opaque = bitmap.alphaMask == 0;
     const Rows rows(bitmap);
     FNImage<Bgra32> image(bitmap.w(), bitmap.h());
     Bgra32* out = image.getExclusive();
@@ -83,7 +84,7 @@ FNImage<Bgra32> maskedColors(const Bitmap& bitmap, const std::array<std::uint32_
         for (std::uint32_t x = 0; x < image.w(); ++x) {
             std::uint32_t pixel = 0;
             for (unsigned i = 0; i < bytesPerPixel; ++i) pixel |= std::uint32_t{*in++} << 8 * i;
-            *out++ = Bgra32(red(pixel), green(pixel), blue(pixel));
+            *out++ = Bgra32(red(pixel), green(pixel), blue(pixel), opaque ? 255 : alpha(pixel));
         }
     }
     return image;

@@ -1,6 +1,8 @@
 #include "fn/imagefile/bmp.h"
 
-#include "fn/imagefile/byte_stream.h"
+#include "fn/whole_file.h"
+
+#include <ostream>
 
 namespace Fn {
 
@@ -65,8 +67,7 @@ void dumpBMP(const FNImageReference& image, std::ostream& stream) {
 }
 
 void saveBMP(const FNImageReference& image, const std::string& fileName) {
-    std::ofstream file = openForWriting(fileName);
-    dumpBMP(image, file);
+    writeWholeFile(fileName, [&](std::ostream& file) { dumpBMP(image, file); });
 }
 
 } // namespace Fn

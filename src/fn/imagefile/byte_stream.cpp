@@ -1,6 +1,8 @@
 #include "fn/imagefile/byte_stream.h"
 
+#include <algorithm>
 #include <filesystem>
+#include <memory>
 #include <vector>
 
 namespace Fn {
@@ -32,19 +34,28 @@ std::string peekBytes(std::istream& stream, std::size_t n, const char* caller) {
 
 FNRMem<unsigned char> readUpTo(std::istream& stream, std::uint64_t n, const char* caller) {
     if (!stream) refuse(caller);
-    constexpr std::uint64_t firstStep = 1u << 16;
-    std::vector<unsigned char> bytes;
-    // Memory follows what has arrived: each step doubles it.
-    while (stream && bytes.size() < n) {
-        const std::size_t before = bytes.size();
-        const std::uint64_t step = std::min(std::max<std::uint64_t>(before, firstStep), n - before);
-        bytes.resize(before + step);
-        stream.read(reinterpret_cast<char*>(bytes.data() + before), static_cast<std::streamsize>(step));
-        bytes.resize(before + static_cast<std::size_t>(stream.gcount()));
+    struct Block {
+        std::unique_ptr<char[]> bytes;
+        std::size_t size;
+    };
+    constexpr std::uint64_t firstStep = 1u << 16, greatestStep = 1u << 26;
+    // Memory follows what has arrived: each block is twice as large as the one before.
+    std::vector<Block> blocks;
+    std::uint64_t size = 0;
+    for (std::uint64_t step = firstStep; stream && size < n; step = std::min(2 * step, greatestStep)) {
+        step = std::min(step, n - size);
+        Block& block = blocks.emplace_back(std::make_unique_for_overwrite<char[]>(step), 0);
+        stream.read(block.bytes.get(), static_cast<std::streamsize>(step));
+        block.size = static_cast<std::size_t>(stream.gcount());
+        size += block.size;
     }
     if (stream.bad()) refuse(caller);
-    FNRMem<unsigned char> result(bytes.size());
-    std::copy(bytes.begin(), bytes.end(), result.getExclusive());
+    FNRMem<unsigned char> result(size);
+    unsigned char* to = result.getExclusive();
+    for (Block& block : blocks) { // so that there is never a second copy of all
+        to = std::copy_n(block.bytes.get(), block.size, to);
+        block.bytes.reset();
+    }
     return result;
 }
 
@@ -61,12 +72,6 @@ std::ifstream openForReading(const std::string& fileName, const char* failure) {
     std::ifstream file(fileName, std::ios::binary);
     std::error_code ignored;
     if (!file || std::filesystem::is_directory(fileName, ignored)) FN_THROW(FNEIOError, failure + fileName);
-    return file;
-}
-
-std::ofstream openForWriting(const std::string& fileName) {
-    std::ofstream file(fileName, std::ios::binary);
-    if (!file) FN_THROW(FNEIOError, "Could not open file for writing: " + fileName);
     return file;
 }
 

@@ -26,9 +26,8 @@ FNRMem<unsigned char> readUpTo(std::istream& stream, std::uint64_t n, const char
 /// the stream is bad.
 FNRMem<unsigned char> readRest(std::istream& stream, std::uint64_t maxBytes, const char* caller);
 
-/// Opens for binary reading or writing. @throws FNEIOError with `failure` and the name.
+/// Opens for binary reading. @throws FNEIOError with `failure` and the name.
 std::ifstream openForReading(const std::string& fileName, const char* failure = "Could not open file: ");
-std::ofstream openForWriting(const std::string& fileName);
 
 /// Writes and flushes. @throws FNEIOError with the text `failure` if the stream does not take all.
 void writeBytes(std::ostream& stream, std::span<const unsigned char> bytes, const char* failure);

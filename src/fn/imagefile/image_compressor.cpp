@@ -6,6 +6,7 @@
 #include "fn/message/dialog.h"
 
 #include <array>
+#include <bit>
 #include <cstdio>
 #include <vector>
 
@@ -143,14 +144,17 @@ public:
     Decoder(const Decoder&) = delete;
     Decoder& operator=(const Decoder&) = delete;
 
-    FNImageReference decode(const Fn::ReadImagePropertiesFeedback& feedback, const Fn::ImageLimits& limits) {
+    /// @param name of the stream in warnings, empty for none
+    FNImageReference decode(const Fn::ReadImagePropertiesFeedback& feedback, const Fn::ImageLimits& limits,
+                            const std::string& name) {
         readHeader();
         feedback.compressionMode(storedMode());
         feedback.pixelDepth(static_cast<unsigned int>(info_.data_precision * info_.num_components));
         const FNImageReference image =
             info_.out_color_space == JCS_GRAYSCALE ? decodeGray(limits) : decodeColor(limits);
         source_.putBack();
-        if (errors_.warningsSize != 0) FNDialog::warn(errors_.collectedWarnings());
+        if (errors_.warningsSize != 0)
+            FNDialog::warn(errors_.collectedWarnings() + (name.empty() ? "" : " in " + name));
         return image;
     }
 
@@ -189,9 +193,26 @@ private:
 
     FNImageReference decodeColor(const Fn::ImageLimits& limits) {
         const char* const refusal = "JpegRgbDecompressImage(): number of output components not supported";
-        if (info_.out_color_space != JCS_RGB) FN_THROW(FNEBadArg, refusal);
-        info_.out_color_space = JCS_EXT_BGRA; // alpha 255
-        return FNImageReferenceFactory::create(decodeAs<Fn::Bgra32>(limits, 4, refusal));
+        const bool inks = info_.out_color_space == JCS_CMYK && limits.rareVariants;
+        if (info_.out_color_space != JCS_RGB && !inks) FN_THROW(FNEBadArg, refusal);
+        if (!inks) info_.out_color_space = JCS_EXT_BGRA; // alpha 255
+        FNImage<Fn::Bgra32> image = decodeAs<Fn::Bgra32>(limits, 4, refusal);
+        if (inks) mixInks(image, info_.saw_Adobe_marker);
+        return FNImageReferenceFactory::create(image);
+    }
+
+    /// Turns cyan, magenta, yellow and black, which lie in the place of colours, into these.
+    /// @param inverted a sample tells how much of the ink is missing: so do all files with Adobe's marker
+    static void mixInks(FNImage<Fn::Bgra32>& image, bool inverted) {
+        const unsigned char flip = inverted ? 0 : 255;
+        for (FNImIter<Fn::Bgra32> pixel(image, image.box()); !pixel.atEnd(); ++pixel) {
+            const auto inks = std::bit_cast<std::array<unsigned char, 4>>(*pixel);
+            const auto light = [&](int ink) {
+                const unsigned product = (inks[static_cast<std::size_t>(ink)] ^ flip) * (inks[3] ^ flip);
+                return static_cast<unsigned char>((product + 127) / 255);
+            };
+            *pixel = Fn::Bgra32(light(0), light(1), light(2));
+        }
     }
 
     template <class T>
@@ -364,6 +385,6 @@ FNImageReference FNImageCompressor::decompress(Format format, const Bytes& bytes
 
 FNImageReference FNImageCompressor::decompressJpeg(std::istream& stream,
                                                    const Fn::ReadImagePropertiesFeedback& feedback,
-                                                   const Fn::ImageLimits& limits) {
-    return Decoder(stream).decode(feedback, limits);
+                                                   const Fn::ImageLimits& limits, const std::string& name) {
+    return Decoder(stream).decode(feedback, limits, name);
 }

@@ -5,6 +5,7 @@
 #include "fn/imagefile/properties_feedback.h"
 
 #include <iosfwd>
+#include <string>
 
 /// Images as blocks of compressed bytes.
 class FNImageCompressor {
@@ -34,5 +35,5 @@ public:
     /// Reads one JPEG image and leaves a stream that can go back behind it. See Fn::readJpeg().
     static FNImageReference decompressJpeg(std::istream& stream,
                                            const Fn::ReadImagePropertiesFeedback& feedback = {},
-                                           const Fn::ImageLimits& limits = {});
+                                           const Fn::ImageLimits& limits = {}, const std::string& name = {});
 };

@@ -8,6 +8,7 @@
 #include "fn/imagefile/pbm.h"
 #include "fn/imagefile/png.h"
 #include "fn/imagefile/tiff.h"
+#include "fn/whole_file.h"
 
 namespace Fn {
 
@@ -19,17 +20,25 @@ constexpr const char* streamName = "input stream";
 /// already
 FNImageReference readAnyFormat(std::istream& stream, const std::string& name, const std::string& fileName,
                                const ReadImagePropertiesFeedback& feedback, const ImageLimits& limits) {
-    if (checkIfIsJpeg(stream)) return readJpeg(stream, feedback, limits);
+    if (checkIfIsJpeg(stream)) return readJpeg(stream, feedback, limits, name);
     if (checkIfIsPng(stream)) return readPng(stream, feedback, limits);
     if (checkIfIsJ2k(stream)) return readJ2k(stream, feedback, limits);
     if (checkIfIsTiff(stream)) return readTiff(stream, streamName, 0, feedback, limits);
     if (checkIfIsPbm(stream)) return readPbm(stream, feedback, limits);
     const std::string start = peekBytes(stream, 2, "Fn::readImage");
+    if (limits.rareVariants && isRarePbm(start)) return readPbm(stream, feedback, limits);
     if (start.empty()) FN_THROW(FNEBadArg, "Fn::readImage: cannot read " + name);
     if (start == "BM") return readBMP(stream, feedback, limits);
     if (start == "\x1F\x8B" && !fileName.empty()) {
-        MemoryStream content(gunzip(fileName, limits));
-        return readAnyFormat(content, name, {}, feedback, limits);
+        GunzipStream content(fileName, limits);
+        try {
+            const FNImageReference image = readAnyFormat(content, name, {}, feedback, limits);
+            content.throwFailure();
+            return image;
+        } catch (const FNException&) {
+            content.throwFailure(); // tells more than what a reader makes of it
+            throw;
+        }
     }
     FN_THROW(FNEBadArg, "Fn::readImage: Not a known image format in " + name);
 }
@@ -55,8 +64,9 @@ FNImageReference readImage(const char* data, unsigned long size, const ReadImage
 
 void writeImage(const FNImageReference& image, const std::string& fileName, FNImageCompressor::Mode mode) {
     if (mode != FNImageCompressor::LOSSLESS) return saveJpeg(image, fileName, mode);
-    std::ofstream file = openForWriting(fileName);
-    image.isColor() ? writePpm(image, file) : writePgm(image, file);
+    writeWholeFile(fileName, [&](std::ostream& file) {
+        image.isColor() ? writePpm(image, file) : writePgm(image, file);
+    });
 }
 
 } // namespace Fn

@@ -254,7 +254,7 @@ FNImageReference readJ2k(std::istream& stream, const ReadImagePropertiesFeedback
     const Container container = containerOf(file.data(), file.size());
     if (container == Container::None)
         FN_THROW(FNEBadFormat, "Fn::readJ2k: stream does not refer to a known JPEG2000 image format.");
-    checkSizes(file, container, limits);
+    checkSizes(file, container, limits.beside(file.size()));
     const Decoder decoder(file, container);
     const opj_image_t& image = decoder.image();
     const Mode family = familyOf(image);

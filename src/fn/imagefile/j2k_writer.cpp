@@ -3,6 +3,7 @@
 #include "fn/image_conversion.h"
 #include "fn/imagefile/byte_stream.h"
 #include "fn/imagefile/j2k_stream.h"
+#include "fn/whole_file.h"
 
 #include <array>
 #include <bit>
@@ -112,9 +113,7 @@ void writeJ2k(const FNImageReference& image, const std::string& formatName, std:
 }
 
 void writeJ2k(const FNImageReference& image, const std::string& formatName, const std::string& fileName) {
-    codecOf(formatName); // before the file is made
-    std::ofstream file = openForWriting(fileName);
-    writeJ2k(image, formatName, file);
+    writeWholeFile(fileName, [&](std::ostream& file) { writeJ2k(image, formatName, file); });
 }
 
 void readWriteJ2k(const std::string& inFile, const std::string& outFile) {

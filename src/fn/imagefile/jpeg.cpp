@@ -1,6 +1,7 @@
 #include "fn/imagefile/jpeg.h"
 
 #include "fn/imagefile/byte_stream.h"
+#include "fn/whole_file.h"
 
 namespace Fn {
 
@@ -15,10 +16,10 @@ bool checkIfIsJpeg(std::istream& stream) {
 }
 
 FNImageReference readJpeg(std::istream& stream, const ReadImagePropertiesFeedback& feedback,
-                          const ImageLimits& limits) {
+                          const ImageLimits& limits, const std::string& name) {
     if (!checkIfIsJpeg(stream))
         FN_THROW(FNEBadArg, "Fn::readJpeg: got a stream  not containing a jpeg image.");
-    return FNImageCompressor::decompressJpeg(stream, feedback, limits);
+    return FNImageCompressor::decompressJpeg(stream, feedback, limits, name);
 }
 
 FNImageReference readJpeg(const char* data, unsigned long size, const ReadImagePropertiesFeedback& feedback,
@@ -30,7 +31,7 @@ FNImageReference readJpeg(const char* data, unsigned long size, const ReadImageP
 FNImageReference loadJpeg(const std::string& fileName, const ReadImagePropertiesFeedback& feedback,
                           const ImageLimits& limits) {
     std::ifstream file = openForReading(fileName);
-    return readJpeg(file, feedback, limits);
+    return readJpeg(file, feedback, limits, fileName);
 }
 
 FNRMem<unsigned char> writeJpeg(const FNImageReference& image, int quality) {
@@ -44,8 +45,7 @@ void writeJpeg(const FNImageReference& image, std::ostream& stream, int quality)
 
 void saveJpeg(const FNImageReference& image, const std::string& fileName, FNImageCompressor::Mode mode) {
     const FNRMem<unsigned char> bytes = writeJpeg(image, FNImageCompressor::jpegQuality(mode));
-    std::ofstream file = openForWriting(fileName);
-    writeBytes(file, bytes.span(), writeFailure);
+    writeWholeFile(fileName, [&](std::ostream& file) { writeBytes(file, bytes.span(), writeFailure); });
 }
 
 SizedJpeg writeJpegWithSizeConstraint(const FNImageReference& image, int maxBytes) {

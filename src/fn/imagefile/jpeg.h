@@ -13,11 +13,12 @@ namespace Fn {
 bool checkIfIsJpeg(std::istream& stream);
 
 /// A gray file becomes mono8, a colour file bgra32. Damage that the decoder can bridge gives an image with a
-/// warning.
+/// warning. Four components (CMYK, YCCK) are a rare variant.
 /// @throws FNEBadArg if the stream does not begin with a JPEG image, or for a file that cannot be decoded, or
-/// with four components.
+/// is of another number of components.
+/// @param name of the stream in warnings; empty if it has none
 FNImageReference readJpeg(std::istream& stream, const ReadImagePropertiesFeedback& feedback = {},
-                          const ImageLimits& limits = {});
+                          const ImageLimits& limits = {}, const std::string& name = {});
 FNImageReference readJpeg(const char* data, unsigned long size,
                           const ReadImagePropertiesFeedback& feedback = {}, const ImageLimits& limits = {});
 /// @throws FNEIOError if the file cannot be opened.

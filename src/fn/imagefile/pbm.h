@@ -5,18 +5,22 @@
 #include "fn/imagefile/properties_feedback.h"
 
 #include <iosfwd>
+#include <string>
 
-/// Binary portable anymaps: PGM (gray, "P5") and PPM (colour, "P6") of 8 or 16 bits. Attributes travel in
-/// comment lines that begin with "# cache:", see attribute_text.h.
+/// Portable anymaps: PGM (gray, "P5") and PPM (colour, "P6") of 8 or 16 bits. Attributes travel in comment
+/// lines that begin with "# cache:", see attribute_text.h. Rare variants are PBM (black and white, "P4") and
+/// the plain forms of all three, with numbers as text ("P1" to "P3").
 
 namespace Fn {
 
 /// Whether the next two bytes, which stay in the stream, begin such a file. @throws FNEIOError if the stream
 /// is bad.
 bool checkIfIsPbm(std::istream& stream);
+/// Whether these two bytes begin one of the rare variants.
+bool isRarePbm(const std::string& start);
 
-/// Gray becomes mono8 or, for a greatest value above 255, mono16; colour bgra32 or rgb48. Samples are
-/// stretched to the full range. Leaves the stream behind the image.
+/// Gray, black and white become mono8 or, for a greatest value above 255, mono16; colour bgra32 or rgb48.
+/// Samples are stretched to the full range. Leaves the stream behind the image.
 /// @throws FNEIOError if the stream ends too early or the attributes are damaged; FNEBadFormat for a wrong
 /// header.
 FNImageReference readPbm(std::istream& stream, const ReadImagePropertiesFeedback& feedback = {},

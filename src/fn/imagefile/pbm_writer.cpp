@@ -2,7 +2,7 @@
 
 #include "fn/image_conversion.h"
 #include "fn/imagefile/attribute_text.h"
-#include "fn/imagefile/byte_stream.h"
+#include "fn/whole_file.h"
 
 #include <vector>
 
@@ -67,8 +67,7 @@ void writePbm(const FNImageReference& image, std::ostream& target, const FNBox& 
 }
 
 void writePbm(const FNImageReference& image, const std::string& fileName, const FNBox& box) {
-    std::ofstream file = openForWriting(fileName);
-    writePbm(image, file, box);
+    writeWholeFile(fileName, [&](std::ostream& file) { writePbm(image, file, box); });
 }
 
 void writePgm(const FNImageReference& image, std::ostream& target) {

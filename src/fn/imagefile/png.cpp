@@ -92,12 +92,12 @@ public:
 
 private:
     void readInfo(const ImageLimits& limits) {
-        // Text and profiles are of no use here and can be bombs.
-        constexpr png_alloc_size_t largestChunk = 8u << 20;
+        // Of the chunks that tell of the image (texts, profiles, gamma and so on) none is of use here, and
+        // libpng allocates what they announce: all are passed over, as those that it does not know.
+        constexpr int allButPaletteAndTransparency = -1;
         errors_.guarded([&] {
             png_set_user_limits(png_, limits.maxWidth, limits.maxHeight);
-            png_set_chunk_malloc_max(png_, largestChunk);
-            png_set_keep_unknown_chunks(png_, PNG_HANDLE_CHUNK_NEVER, nullptr, 0);
+            png_set_keep_unknown_chunks(png_, PNG_HANDLE_CHUNK_NEVER, nullptr, allButPaletteAndTransparency);
             png_read_info(png_, info_);
             png_get_IHDR(png_, info_, &width_, &height_, &bitDepth_, &colorType_, nullptr, nullptr, nullptr);
         });

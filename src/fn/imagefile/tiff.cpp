@@ -2,6 +2,7 @@
 
 #include "fn/imagefile/byte_stream.h"
 
+#include <algorithm>
 #include <cstdarg>
 #include <cstdio>
 #include <filesystem>
@@ -60,7 +61,7 @@ using Tiff = std::unique_ptr<TIFF, Close>;
 Tiff open(Source& source, const std::string& name, const ImageLimits& limits) {
     const std::unique_ptr<TIFFOpenOptions, Close> options(TIFFOpenOptionsAlloc());
     if (!options) throw std::bad_alloc();
-    TIFFOpenOptionsSetMaxSingleMemAlloc(options.get(), static_cast<tmsize_t>(limits.maxBytes));
+    TIFFOpenOptionsSetMaxSingleMemAlloc(options.get(), static_cast<tmsize_t>(limits.maxBytes / 2));
     TIFFOpenOptionsSetErrorHandlerExtR(options.get(), Source::onError, &source);
     TIFFOpenOptionsSetWarningHandlerExtR(options.get(), Source::onWarning, &source);
     // "m": no memory mapping
@@ -70,9 +71,11 @@ Tiff open(Source& source, const std::string& name, const ImageLimits& limits) {
     return tiff;
 }
 
-template <class T> T tag(TIFF* tiff, std::uint32_t id, const char* failure) {
+/// @param defaulted whether a tag that is missing has the format's own default, where there is one
+template <class T> T tag(TIFF* tiff, std::uint32_t id, const char* failure, bool defaulted = false) {
     T value{};
-    if (!TIFFGetField(tiff, id, &value)) FN_THROW(FNEBadFormat, failure);
+    if (!(defaulted ? TIFFGetFieldDefaulted(tiff, id, &value) : TIFFGetField(tiff, id, &value)))
+        FN_THROW(FNEBadFormat, failure);
     return value;
 }
 
@@ -112,12 +115,13 @@ struct Layout {
     std::uint16_t bits, samples, photometric;
 
     /// @throws FNEBadFormat for a kind of file that is not read, but for its photometric interpretation.
-    explicit Layout(TIFF* tiff)
+    Layout(TIFF* tiff, bool defaulted)
         : width(tag<std::uint32_t>(tiff, TIFFTAG_IMAGEWIDTH, "Fn::readTiff: unable to get IMAGEWIDTH")),
           height(tag<std::uint32_t>(tiff, TIFFTAG_IMAGELENGTH, "Fn::readTiff: unable to get IMAGELENGTH")),
-          bits(tag<std::uint16_t>(tiff, TIFFTAG_BITSPERSAMPLE, "Fn::readTiff: unable to get BITSPERSAMPLE")),
+          bits(tag<std::uint16_t>(tiff, TIFFTAG_BITSPERSAMPLE, "Fn::readTiff: unable to get BITSPERSAMPLE",
+                                  defaulted)),
           samples(tag<std::uint16_t>(tiff, TIFFTAG_SAMPLESPERPIXEL,
-                                     "Fn::readTiff: unable to get SAMPLESPERPIXEL")),
+                                     "Fn::readTiff: unable to get SAMPLESPERPIXEL", defaulted)),
           photometric(
               tag<std::uint16_t>(tiff, TIFFTAG_PHOTOMETRIC, "Fn::readTiff: error getting photometric")) {}
 
@@ -126,13 +130,28 @@ struct Layout {
         if (bits != 8 && bits != 16) refuse("Fn::readTiff: can only handle 8 bit or 16 bit images");
         if (samples != 1 && samples != 3 && samples != 4)
             refuse("Fn::readTiff: can only handle 1-channel gray scale or 3 or 4-channel color");
-        std::uint16_t format = SAMPLEFORMAT_UINT;
-        if (TIFFGetField(tiff, TIFFTAG_SAMPLEFORMAT, &format) && format != SAMPLEFORMAT_UINT)
-            refuse("Fn::readTiff: can only read images having sampleformat UINT");
+        checkFormat(tiff);
         const auto planes =
             tag<std::uint16_t>(tiff, TIFFTAG_PLANARCONFIG, "Fn::readTiff: unable to get PLANARCONFIG");
         if (planes != PLANARCONFIG_CONTIG) refuse("Fn::readTiff: can only handle contiguous tiff files.");
         if (TIFFIsTiled(tiff)) refuse("Fn::readTiff: unable to read tiled images");
+    }
+
+    void checkFormat(TIFF* tiff) const {
+        std::uint16_t format = SAMPLEFORMAT_UINT;
+        if (TIFFGetField(tiff, TIFFTAG_SAMPLEFORMAT, &format) && format != SAMPLEFORMAT_UINT)
+            FN_THROW(FNEBadFormat, "Fn::readTiff: can only read images having sampleformat UINT");
+    }
+
+    /// Whether neither check() nor checkPhotometric() refuses it.
+    bool isPlain(TIFF* tiff) const {
+        try {
+            check(tiff);
+            checkPhotometric();
+            return true;
+        } catch (const FNEBadFormat&) {
+            return false;
+        }
     }
 
     void checkPhotometric() const {
@@ -179,6 +198,53 @@ FNImageReference readRows(TIFF* tiff, const Layout& layout, const FNImageAttribu
     return FNImageReferenceFactory::create(image, attributes);
 }
 
+/// The conversions of libtiff: any layout, as colours of 8 bits. The rows stay in stored order.
+class ConvertedRows {
+public:
+    ConvertedRows(TIFF* tiff, const Source& source) : source_(source) {
+        char reason[1024] = "";
+        constexpr int stopAtErrors = 1;
+        if (!TIFFRGBAImageOK(tiff, reason) || !TIFFRGBAImageBegin(&image_, tiff, stopAtErrors, reason))
+            FN_THROW(FNEBadFormat, std::string("Fn::readTiff: ") + reason);
+        image_.req_orientation = image_.orientation;
+    }
+    ~ConvertedRows() { TIFFRGBAImageEnd(&image_); }
+    ConvertedRows(const ConvertedRows&) = delete;
+    ConvertedRows& operator=(const ConvertedRows&) = delete;
+
+    FNImage<Bgra32> read() {
+        FNImage<Bgra32> image(image_.width, image_.height);
+        static_assert(sizeof(Bgra32) == sizeof(std::uint32_t));
+        Bgra32* const pixels = image.getExclusive();
+        auto* const raster = reinterpret_cast<std::uint32_t*>(pixels);
+        if (!TIFFRGBAImageGet(&image_, raster, image_.width, image_.height))
+            FN_THROW(FNEBadFormat, "Fn::readTiff: bad data: " + source_.error);
+        for (std::uint64_t i = 0; i < image.size(); ++i) {
+            const std::uint32_t p = raster[i];
+            const auto sample = [p](unsigned shift) { return static_cast<unsigned char>(p >> shift); };
+            pixels[i] = Bgra32(sample(0), sample(8), sample(16), sample(24));
+        }
+        return image;
+    }
+
+private:
+    const Source& source_;
+    TIFFRGBAImage image_{};
+};
+
+FNImageReference readConverted(TIFF* tiff, const Layout& layout, const Source& source,
+                               const FNImageAttributes& attributes, const ImageLimits& limits) {
+    layout.checkFormat(tiff);
+    limits.check(layout.width, layout.height, 2 * sizeof(Bgra32), "Fn::readTiff");
+    const FNImage<Bgra32> colors = ConvertedRows(tiff, source).read();
+    const bool gray =
+        layout.photometric == PHOTOMETRIC_MINISWHITE || layout.photometric == PHOTOMETRIC_MINISBLACK;
+    if (!gray) return FNImageReferenceFactory::create(colors, attributes);
+    FNImage<unsigned char> image(colors.w(), colors.h());
+    std::ranges::transform(colors.span(), image.getExclusive(), [](const Bgra32& p) { return p.r; });
+    return FNImageReferenceFactory::create(image, attributes);
+}
+
 } // namespace
 
 bool checkIfIsTiff(std::istream& stream) {
@@ -189,26 +255,29 @@ bool checkIfIsTiff(std::istream& stream) {
 FNImageReference readTiff(std::istream& stream, const std::string& name, unsigned int directory,
                           const ReadImagePropertiesFeedback& feedback, const ImageLimits& limits) {
     Source source{readRest(stream, limits.maxBytes, "Fn::readTiff"), 0, {}};
-    const Tiff tiff = open(source, name, limits);
+    const ImageLimits left = limits.beside(source.bytes.size());
+    const Tiff tiff = open(source, name, left);
     if (directory != 0 && !TIFFSetDirectory(tiff.get(), static_cast<tdir_t>(directory)))
         FN_THROW(FNEBadFormat, "Fn::readTiff: Cannot set directory to '" + std::to_string(directory) + "'");
 
-    const Layout layout(tiff.get());
-    layout.check(tiff.get());
+    const Layout layout(tiff.get(), limits.rareVariants);
+    const bool converted = limits.rareVariants && !layout.isPlain(tiff.get());
+    if (!converted) layout.check(tiff.get());
     feedback.compressionMode(modeOf(layout.photometric));
     feedback.pixelDepth(static_cast<unsigned int>(layout.samples * layout.bits));
-    layout.checkPhotometric();
+    if (!converted) layout.checkPhotometric();
 
     FNImageAttributes attributes;
     const char* description = nullptr;
     if (TIFFGetField(tiff.get(), TIFFTAG_IMAGEDESCRIPTION, &description) && description)
         attributes[tiffDescriptionAttribute] = description;
 
+    if (converted) return readConverted(tiff.get(), layout, source, attributes, left);
     const auto read = layout.samples == 1 ? layout.bits == 8 ? readRows<std::uint8_t, unsigned char>
                                                              : readRows<std::uint16_t, unsigned short>
                       : layout.bits == 8 ? readRows<std::uint8_t, Bgra32>
                                           : readRows<std::uint16_t, Rgb48>;
-    return read(tiff.get(), layout, attributes, limits);
+    return read(tiff.get(), layout, attributes, left);
 }
 
 FNImageReference loadTiff(const std::string& fileName, const ReadImagePropertiesFeedback& feedback,
