@@ -1,9 +1,9 @@
 # What `cmake --install` gives beside the programs: the library with its public headers (see orbek_public_headers), the
-# packages for CMake and pkg-config, and a configuration that is ready for use. The models are installed by tools/.
+# packages for CMake and pkg-config, a configuration that is ready for use, the examples with their pictures, and the
+# manual. The models are installed by tools/.
 
 include(CMakePackageConfigHelpers)
 
-set(ORBEK_DATA ${CMAKE_INSTALL_DATADIR}/orbek)
 set(package_folder ${CMAKE_INSTALL_LIBDIR}/cmake/orbek)
 set(packages ${CMAKE_CURRENT_BINARY_DIR}/packages)
 
@@ -19,9 +19,17 @@ string(REGEX REPLACE "/$" "" ORBEK_PREFIX_FROM_PC "${ORBEK_PREFIX_FROM_PC}")
 configure_file(cmake/orbek.pc.in ${packages}/orbek.pc @ONLY)
 install(FILES ${packages}/orbek.pc DESTINATION ${CMAKE_INSTALL_LIBDIR}/pkgconfig)
 
-# The configuration names the folder of the models, which is known at the time of installation.
-install(CODE "
-    set(INSTALLDIR \"\${CMAKE_INSTALL_PREFIX}/${ORBEK_DATA}\")
-    file(MAKE_DIRECTORY \"\$ENV{DESTDIR}\${INSTALLDIR}\")
-    configure_file(\"${CMAKE_SOURCE_DIR}/cmake/orbek.conf.in\" \"\$ENV{DESTDIR}\${INSTALLDIR}/orbek.conf\" @ONLY)
-")
+# Nothing in the tree names its own place, so that it can be moved: the configuration refers to the library's.
+install(FILES cmake/orbek.conf DESTINATION ${ORBEK_DATA})
+
+# The people of the ready-made capture device lie where that one looks, and the examples that use them beside them.
+install(DIRECTORY examples/ DESTINATION ${ORBEK_DATA}/examples PATTERN CMakeLists.txt EXCLUDE
+                                                               PATTERN convert.cpp EXCLUDE)
+foreach(example camera find_faces people search_in_c)
+    install(FILES examples/${example}/CMakeLists.txt DESTINATION ${ORBEK_DATA}/examples/${example})
+endforeach()
+
+# What there is to read.
+install(DIRECTORY docs/manual DESTINATION ${CMAKE_INSTALL_DOCDIR})
+install(FILES models/CARD.md docs/scan_formats.md DESTINATION ${CMAKE_INSTALL_DOCDIR})
+install(DIRECTORY ${CMAKE_BINARY_DIR}/docs/html DESTINATION ${CMAKE_INSTALL_DOCDIR} OPTIONAL)

@@ -21,7 +21,8 @@ int main(int argc, char** argv) {
 
         // Eye distances from 5 to 40 percent of the image's width, everywhere in the image.
         const auto faces = faceFinder.find(image, 0.05f, 0.4f, 0, 0, width, height);
-        std::cout << faces.size() << " faces in " << width << " x " << height << " pixels\n";
+        std::cout << faces.size() << (faces.size() == 1 ? " face in " : " faces in ") << width << " x "
+                  << height << " pixels\n";
         for (const Orbek::Face::Location& face : faces) {
             std::cout << "face at " << face.pos.x << ", " << face.pos.y << ", confidence " << face.confidence
                       << "\n";

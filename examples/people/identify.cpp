@@ -18,7 +18,7 @@ public:
     void eyesFound(const Orbek::Eyes::Location&) override {}
     void eyesNotFound() override { std::cout << "no eyes\n"; }
     void matches(const std::list<Orbek::Match>& matches) override {
-        std::cout << matches.size() << " matches\n";
+        std::cout << matches.size() << (matches.size() == 1 ? " match\n" : " matches\n");
         for (const Orbek::Match& match : matches) std::cout << match.name << ": " << match.score << "\n";
     }
     void end() override {}

@@ -3,6 +3,7 @@
 #include "cmp/fir.h"
 
 #include <algorithm>
+#include <functional>
 #include <vector>
 
 namespace Cmp {
@@ -11,6 +12,8 @@ namespace Cmp {
 /// reads them.
 class Population {
 public:
+    using Visitor = std::function<void(const std::string& id, const FIR& fir)>;
+
     class Body {
     public:
         virtual ~Body() = default;
@@ -20,6 +23,9 @@ public:
         virtual void remove(const std::string& id) = 0;
         /// The first record of that id. @throws FNEBadArg if there is none
         virtual FIR get(const std::string& id) const = 0;
+        virtual std::size_t size() const = 0;
+        /// Calls visit(id, record) for all, in order of addition.
+        virtual void visit(const Visitor& visit) const = 0;
     };
 
     explicit Population(const FNCountedPtr<Body>& body) : body_(body) {}
@@ -27,6 +33,8 @@ public:
     void add(const FIR& fir, const std::string& id) { body_->add(fir, id); }
     void remove(const std::string& id) { body_->remove(id); }
     FIR get(const std::string& id) const { return body_->get(id); }
+    std::size_t size() const { return body_->size(); }
+    void visit(const Visitor& visit) const { body_->visit(visit); }
 
     const FNCountedPtr<Body>& body() const { return body_; }
 
@@ -57,6 +65,10 @@ public:
         const auto item = find(id);
         if (item == items_.end()) FN_THROW(FNEBadArg, "Attempting to retrieve nonexisting element");
         return item->fir;
+    }
+    std::size_t size() const override { return items_.size(); }
+    void visit(const Population::Visitor& visit) const override {
+        for (const Item& item : items_) visit(item.id, item.fir);
     }
 
     /// In order of addition.

@@ -65,8 +65,13 @@ Type SupportedFrameGrabberDefs::define() {
 }
 
 Type DllFrameGrabberFactoryCacheDef::define() {
+    std::string kinds;
+    for (std::size_t i = 0; i < std::size(frameGrabberKinds); ++i)
+        if (hasLibrary(static_cast<FrameGrabberEnum>(i)))
+            kinds += (kinds.empty() ? "" : " ") + std::string(frameGrabberKinds[i].name);
     return Type(typeId(), "Pathes to the shared libraries of the Supported Frame Grabbers",
-                properties(property<DllPaths>::create("DllPaths", "The Paths of the dlls")), "", false);
+                properties(property<DllPaths>::create("DllPaths", "The Paths of the dlls")),
+                std::list<Default>{Default(type<DllPaths>(), "DllPaths", kinds)}, "", false);
 }
 
 } // namespace FG

@@ -68,6 +68,11 @@ inline constexpr FrameGrabberKind frameGrabberKinds[] = {
     {"ImageFiles", "capture device emulation using files"},
 };
 
+/// Whether a kind's driver lives in a shared library of its own.
+constexpr bool hasLibrary(FrameGrabberEnum kind) {
+    return kind >= FrameGrabberEnum::Basler && kind <= FrameGrabberEnum::DSLR;
+}
+
 /// All kinds.
 struct FrameGrabberFullSet {
     static std::string typeId() { return "FG::FrameGrabberFullSet"; }
@@ -84,7 +89,7 @@ struct SupportedFrameGrabberDefs {
 /// One capture device: a kind and its settings.
 using FrameGrabberFactoryDef = Fn::Deployment::Alternative<SupportedFrameGrabberDefs>;
 
-/// Where the shared libraries of grabbers are, by kind.
+/// Where the shared libraries of grabbers are, by kind. All kinds that may have one are listed, with no path.
 struct DllFrameGrabberFactoryCacheDef {
     using DllPaths = Fn::Deployment::Container<Fn::Deployment::String>;
 

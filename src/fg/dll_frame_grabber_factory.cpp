@@ -28,24 +28,23 @@ GrabberPair DllFrameGrabberFactory::createBoth(const Component& settings, const 
     return {source, FNCountedPtr<StillImageSource>(new StillImageSourceEmulator(source))};
 }
 
-bool DllFrameGrabberFactoryCache::has(const std::string& kind) const {
-    return Fn::Deployment::listsElement(component_.subComponent("DllPaths"), kind);
+std::string DllFrameGrabberFactoryCache::path(const std::string& kind) const {
+    const Component paths = component_.subComponent("DllPaths");
+    using Fn::Deployment::String;
+    if (!Fn::Deployment::listsElement(paths, kind)) return {};
+    return Fn::Deployment::Value<String>::get(paths.subComponent(kind));
 }
 
 DllFrameGrabberFactory DllFrameGrabberFactoryCache::get(const std::string& kind) {
     const FNMutexLock lock(mutex_);
     const auto known = factories_.find(kind);
     if (known != factories_.end()) return known->second;
+    if (const std::string file = path(kind); !file.empty())
+        return factories_.emplace(kind, DllFrameGrabberFactory(file)).first->second;
     std::string names;
-    for (const Component& path : component_.subComponent("DllPaths").subComponents()) {
-        const std::string name = path.ownType().name();
-        if (name == kind) {
-            using Fn::Deployment::String;
-            const std::string file = Fn::Deployment::Value<String>::get(path);
-            return factories_.emplace(kind, DllFrameGrabberFactory(file)).first->second;
-        }
-        names += (names.empty() ? "" : ", ") + name;
-    }
+    for (const Component& entry : component_.subComponent("DllPaths").subComponents())
+        if (const std::string name = entry.ownType().name(); !path(name).empty())
+            names += (names.empty() ? "" : ", ") + name;
     FN_THROW(FNEBadArg, "DllFrameGrabberFactoryCache: could not locate Path for Dlls of type " + kind +
                             ". Configured Types are: [" + names + "]");
 }

@@ -53,8 +53,8 @@ public:
     explicit DllFrameGrabberFactoryCache(const Fn::Deployment::Component& component)
         : component_(component) {}
 
-    /// Whether a path is configured for the kind.
-    bool has(const std::string& kind) const;
+    /// The library that is configured for the kind; empty if none is.
+    std::string path(const std::string& kind) const;
     /// @throws FNEBadArg if no path is configured for the kind; FNESysError if the library cannot be used
     DllFrameGrabberFactory get(const std::string& kind);
 

@@ -4,6 +4,7 @@
 #include "fn/deployment/composite_values.h"
 #include "orbek/implementation/capture_device_impl.h"
 #include "orbek/implementation/configuration_implementation.h"
+#include "orbek/implementation/plugin_camera.h"
 #include "orbek/implementation/video_format_body.h"
 
 namespace Orbek {
@@ -17,8 +18,9 @@ FG::GrabberPair makeGrabber(const Component& device, const std::string& name,
                             FG::DllFrameGrabberFactoryCache& plugins) {
     const FG::GrabberPair made =
         FG::FrameGrabberFactory<FG::FrameGrabberFullSet>::create2(device, name, plugins);
-    const std::string kind = device.read(true);
-    if (made.first || made.second || !plugins.has(kind)) return made;
+    const std::string kind = device.read(true), library = plugins.path(kind);
+    if (made.first || made.second || library.empty()) return made;
+    if (const Fn::Dll dll(library); isPluginCamera(dll)) return openPluginCamera(dll, name);
     return plugins.get(kind).createBoth(device.subComponent(kind), name);
 }
 

@@ -60,7 +60,8 @@ public:
     /// and at the next use of the configuration.
     /// @throws std::exception naming the file and why it cannot be written; from then on, so does every use
     void flush();
-    /// Stores the default as the value of a key, as if setValue() had been called with it.
+    /// Replaces a stored value by the default, which then is a stored value like others. Where none is
+    /// stored, none will be.
     void resetToDefault(const std::string& key);
 
     /// All keys, in the order of the tree: all choices of an alternative, and the present elements of a

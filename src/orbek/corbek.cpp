@@ -225,6 +225,31 @@ int orbekCompare(const unsigned char* fir1, unsigned int size1, const unsigned c
     });
 }
 
+int orbekMergeFIRs(const unsigned char* fir1, unsigned int size1, const unsigned char* fir2,
+                   unsigned int size2, unsigned char* buffer, int bufferSize, unsigned int* firSize) {
+    return guarded("corbek.dll:orbekMergeFIRs", failed, [&] {
+        const FIR first = recordOf(fir1, size1), second = recordOf(fir2, size2);
+        const FIR merged = Enrollment::Processor(configuration()).merge(first, second);
+        *notNull(firSize, "firSize") = static_cast<unsigned int>(merged.size());
+        return Room<unsigned char>{buffer, bufferSize}.fill(
+            merged.size(), [&](unsigned char* memory) { merged.serialize(memory); });
+    });
+}
+
+int orbekRequestFAR(float rate, float* threshold) {
+    return guarded("corbek.dll:orbekRequestFAR", failed, [&] {
+        *notNull(threshold, "threshold") = ScoreMappings(configuration()).requestFAR(rate);
+        return done;
+    });
+}
+
+int orbekExpectedFAR(float threshold, float* rate) {
+    return guarded("corbek.dll:orbekExpectedFAR", failed, [&] {
+        *notNull(rate, "rate") = ScoreMappings(configuration()).expectedFAR(threshold);
+        return done;
+    });
+}
+
 void* orbekCreatePopulation() {
     return guarded("corbek.dll:orbekCreatePopulation", static_cast<void*>(nullptr), [&]() -> void* {
         const FNCountedPtr<Population> created(new Population(configuration()));

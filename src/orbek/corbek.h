@@ -61,6 +61,23 @@ int orbekFindEyes(const char* jpeg, unsigned int jpegSize, float* x0, float* y0,
 int orbekCompare(const unsigned char* fir1, unsigned int size1, const unsigned char* fir2, unsigned int size2,
                  float* score);
 
+/** Makes one record from two of the same person. What the buffer is told as to orbekGenerateFIR().
+ * @return 0; 1 for a failure; 3 if the buffer is too small, which is then left as it is */
+int orbekMergeFIRs(const unsigned char* fir1, unsigned int size1, const unsigned char* fir2,
+                   unsigned int size2, unsigned char* buffer, int bufferSize, unsigned int* firSize);
+
+/** The threshold with a rate of false acceptances: the share of other people whose score reaches it.
+ * @param rate from 0 to 1; beyond, it counts as 0 or 1
+ * @param[out] threshold for orbekBestMatches(), and for scores of orbekCompare(), which reach it if they are
+ * not below it. The greatest score is 1: a threshold of 1 does not keep everybody out
+ * @return 0, or 1 for a failure */
+int orbekRequestFAR(float rate, float* threshold);
+
+/** The rate of false acceptances that a threshold has: as small as this is the share of other people with
+ * such a score.
+ * @return 0, or 1 for a failure */
+int orbekExpectedFAR(float threshold, float* rate);
+
 /** Makes an empty population.
  * @return a handle that is valid until orbekDeletePopulation(), or null for a failure */
 void* orbekCreatePopulation(void);
@@ -78,7 +95,8 @@ int orbekAppendToPopulation(void* population, const unsigned char* fir, unsigned
 int orbekRemoveFromPopulation(void* population, const char* id);
 
 /** Searches the records that are most like one.
- * @param threshold least score of a match
+ * @param threshold that the scores of matches are above, in the algorithm's own scale: a record whose score
+ * is at the threshold may match, and with a threshold of 1 those do that are beyond the end of the scale
  * @param[out] matches room for `maxMatches` of them; the best comes first
  * @param[out] count how many there are; 0 after a failure
  * @return 0, or 1 for a failure */

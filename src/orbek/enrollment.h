@@ -41,7 +41,8 @@ public:
     using SampleIterator = std::list<Sample>::const_iterator;
 
     /// Reads the model files, if this is the first object of the configuration that needs them.
-    /// @throws std::exception that names the file or the setting and what is wrong with it
+    /// @throws std::exception that names the file, or tells the value that a setting cannot have;
+    /// Configuration::faults() and checkValue() name the setting
     explicit Processor(const Configuration& configuration);
     Processor(const Processor&);
     Processor& operator=(const Processor&);

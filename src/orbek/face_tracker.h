@@ -24,7 +24,8 @@ public:
     using TrackedFace = std::pair<std::string, Location>;
 
     /// Reads the model files.
-    /// @throws std::exception that names the file or the setting and what is wrong with it
+    /// @throws std::exception that names the file, or tells the value that a setting cannot have;
+    /// Configuration::faults() and checkValue() name the setting
     explicit Tracker(const Configuration& configuration);
     Tracker(const Tracker&);
     Tracker& operator=(const Tracker&);

@@ -30,8 +30,11 @@ public:
     Score compare(const FIR& first, const FIR& second) const;
     /// The scores of all records, in the order of the population.
     CountedPtr<std::list<Score>> compare(const FIR& fir, const Population& population) const;
-    /// The best records whose scores are above a threshold, the best one first, and of equal ones the one
-    /// with the greater id. Takes as many threads as the configuration says.
+    /// The best records that reach a threshold, the best one first, and of equal ones the one with the
+    /// greater id. What is compared is the raw score: it is above that of the threshold. So with a threshold
+    /// of 1, at which scores end, those match that are beyond the end. Takes as many threads as the
+    /// configuration says.
+    /// @throws std::exception for a threshold that is no number
     CountedPtr<std::list<Match>> bestMatches(const FIR& fir, const Population& population,
                                              const Score& threshold, unsigned int maxMatches) const;
 

@@ -40,7 +40,8 @@ public:
 
     /// Reads the model files, if this is the first object of the configuration that needs them.
     /// @param population shared: later changes show. Nobody changes it during process().
-    /// @throws std::exception that names the file or the setting and what is wrong with it
+    /// @throws std::exception that names the file, or tells the value that a setting cannot have;
+    /// Configuration::faults() and checkValue() name the setting
     Processor(const Configuration& configuration, const Population& population);
     Processor(const Processor&);
     Processor& operator=(const Processor&);
@@ -49,13 +50,15 @@ public:
     /// Looks for the eyes of samples that do not have them. One picture after the other: once the feedback
     /// learns of the next one, nothing refers to pixels of those before, which are asked for anew if they are
     /// needed.
-    /// @param threshold matches have scores above it
+    /// @param threshold that matches reach, as FacialMatchingEngine::bestMatches() tells
     /// @param maxMatches to list at most
     /// @throws std::exception for an image or a population that cannot be used, and what the feedback throws;
     /// end() is not called then
     void process(SampleIterator first, SampleIterator last, const Score& threshold, const Feedback& feedback,
                  unsigned int maxMatches) const;
-    /// Takes images until one has matches, or time is over.
+    /// Takes images until one has matches, or time is over. Each image is a search of its own, so the rate of
+    /// false acceptances counts for each: a stranger who stays before the camera for 100 images has 100 times
+    /// the chance to be taken for somebody.
     void process(const CaptureDevice& device, const Score& threshold, const Feedback& feedback,
                  unsigned int maxMatches) const;
 

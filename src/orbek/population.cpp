@@ -1,6 +1,14 @@
 #include "orbek/population.h"
 
 #include "orbek/implementation/comparison.h"
+#include "orbek/implementation/population_file.h"
+
+#include <cerrno>
+#include <cstring>
+#include <fstream>
+#include <limits>
+
+#include <unistd.h>
 
 namespace Orbek {
 
@@ -20,6 +28,64 @@ void Population::remove(const std::string& id) {
 
 FIR Population::get(const std::string& id) const {
     return FIR::Implementation::make(implementation_->population.get(id));
+}
+
+std::size_t Population::size() const {
+    return implementation_->population.size();
+}
+
+std::vector<std::string> Population::ids() const {
+    std::vector<std::string> ids;
+    implementation_->population.visit([&](const std::string& id, const Cmp::FIR&) { ids.push_back(id); });
+    return ids;
+}
+
+void Population::save(std::ostream& stream) const {
+    if (size() > std::numeric_limits<std::uint32_t>::max())
+        FN_THROW(FNEBadArg, "Population: too many records for one file");
+    writePopulationHead(stream, static_cast<std::uint32_t>(size()));
+    implementation_->population.visit([&](const std::string& id, const Cmp::FIR& fir) {
+        writePopulationRecord(stream, id, fir.body()->serialize());
+    });
+}
+
+void Population::save(const std::string& fileName) const {
+    const std::string beside = fileName + "-" + std::to_string(getpid()) + ".tmp";
+    try {
+        std::ofstream file(beside, std::ios::binary | std::ios::trunc);
+        if (!file) FN_THROW(FNEIOError, std::string("cannot be opened for writing: ") + std::strerror(errno));
+        save(file);
+        if (!file.flush()) FN_THROW(FNEIOError, std::string("cannot be written: ") + std::strerror(errno));
+        if (std::rename(beside.c_str(), fileName.c_str()) != 0)
+            FN_THROW(FNEIOError, std::string("cannot be written: ") + std::strerror(errno));
+    } catch (const std::exception& e) {
+        unlink(beside.c_str());
+        FN_THROW(FNEIOError, fileName + ": " + e.what());
+    }
+}
+
+Population Population::load(const Configuration& configuration, std::istream& stream) {
+    const Population population(configuration);
+    Cmp::Population& records = population.implementation_->population;
+    const Cmp::RecordBuilder builder =
+        population.implementation_->strategy().algorithm()->createRecordBuilder();
+    readPopulation(stream, [&](const std::string& id, const Fn::Package& record) {
+        records.add(builder->create(record), id);
+    });
+    return population;
+}
+
+Population Population::load(const Configuration& configuration, const std::string& fileName) {
+    std::ifstream file(fileName, std::ios::binary);
+    if (!file) FN_THROW(FNEIOError, fileName + ": cannot be opened: " + std::strerror(errno));
+    try {
+        const Population population = load(configuration, file);
+        if (file.peek() != std::ifstream::traits_type::eof())
+            FN_THROW(FNEBadFormat, "Population: the file does not end behind its last record");
+        return population;
+    } catch (const std::exception& e) {
+        FN_THROW(FNEIOError, fileName + ": " + e.what());
+    }
 }
 
 } // namespace Orbek

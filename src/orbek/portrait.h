@@ -16,7 +16,9 @@ namespace Orbek::Portrait {
 /// The measures of one portrait: each is computed when it is first asked for, and kept. Copies share them,
 /// and any number of threads may ask.
 ///
-/// Lengths are pixels of the image. eye0 is the eye that is given first, on the image's left. Scores of
+/// Lengths are pixels of the image. eye0 is the eye that was given first, and is taken for the one on the
+/// image's left: eyes that are given the other way round are not exchanged, and measure a face that is upside
+/// down. Scores of
 /// trained measures have no unit; the limits of ISO_19794_5::FullFrontal::Test are at home among them, and
 /// models/CARD.md tells how often each is right there.
 ///

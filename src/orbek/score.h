@@ -15,7 +15,7 @@ private:
 };
 
 /// How sure it is that two records are of one person, from 0 to 1. Holds any number as it is; where a score
-/// is a threshold, what is beyond 0 and 1 counts as 0 and 1.
+/// is a threshold, what is beyond 0 and 1 counts as 0 and 1, and what is no number is refused.
 class Score {
 public:
     Score(float value) : value_(value) {}
@@ -28,8 +28,10 @@ private:
 
 /// From scores to the errors that a threshold makes, and back.
 ///
-/// The false acceptance rate (FAR) is the share of comparisons of different people whose score is above a
-/// threshold; the false rejection rate (FRR) is the share of comparisons of one person whose score is below.
+/// The false acceptance rate (FAR) is the share of comparisons of different people whose score is at or above
+/// a threshold; the false rejection rate (FRR) is the share of comparisons of one person whose score is
+/// below. Scores end at 1, and whatever is more alike than that has this score, too: the threshold of a FAR
+/// of 0 is 1, and does not keep everybody out.
 ///
 ///     const Orbek::Score threshold = Orbek::ScoreMappings(configuration).requestFAR(0.001f);
 class [[gnu::visibility("default")]] ScoreMappings {
@@ -39,7 +41,8 @@ public:
     ScoreMappings& operator=(const ScoreMappings&);
     ~ScoreMappings();
 
-    /// The threshold that has a rate.
+    /// The threshold that has a rate. Rates beyond 0 and 1 count as 0 and 1.
+    /// @throws std::exception for what is no number; so do the next ones
     Score requestFAR(float rate) const;
     Score requestFRR(float rate) const;
     /// The rate of a threshold.
@@ -61,6 +64,7 @@ public:
     InternalScoreMappings& operator=(const InternalScoreMappings&);
     ~InternalScoreMappings();
 
+    /// @throws std::exception for what is no number; so does the other
     Score convert(float raw) const;
     RawScore convert(const Score& score) const;
 

@@ -29,7 +29,8 @@ public:
 using Feedback = CountedPtr<FeedbackBody>;
 
 /// Tells whether pictures show the person of a record. Each picture is compared for itself, and the first
-/// whose score reaches the threshold decides.
+/// whose score reaches the threshold, is it or more, decides. So each picture is a comparison of its own: the
+/// rate of false acceptances of ten pictures is up to ten times that of one.
 ///
 ///     const Orbek::Score threshold = Orbek::ScoreMappings(configuration).requestFAR(0.001f);
 ///     Orbek::Verification::Processor processor(configuration);
@@ -43,7 +44,8 @@ public:
     using SampleIterator = std::list<Sample>::const_iterator;
 
     /// Reads the model files, if this is the first object of the configuration that needs them.
-    /// @throws std::exception that names the file or the setting and what is wrong with it
+    /// @throws std::exception that names the file, or tells the value that a setting cannot have;
+    /// Configuration::faults() and checkValue() name the setting
     explicit Processor(const Configuration& configuration);
     Processor(const Processor&);
     Processor& operator=(const Processor&);

@@ -110,6 +110,68 @@ TEST(CaptureDevice, LivesInAPlugInWhereOneIsConfigured) {
               "FNESysError: Cannot load library: /no/such.so");
 }
 
+/// A device of the camera in C that is named so.
+CaptureDevice cameraInC(const std::string& name) {
+    return createCaptureDevice(configured("ORBEK.CaptureDevices." + name + " = DSLR\n" +
+                                          "ORBEK.FgDllCache.DllPaths.DSLR = " ORBEK_C_CAMERA "\n"),
+                               name);
+}
+
+TEST(CaptureDevice, MayBeACameraInC) {
+    unsetenv("ORBEK_TEST_CAMERA");
+    {
+        const CaptureDevice device = cameraInC("gray");
+        const Image frame = device->capture(), picture = device->release();
+        EXPECT_FALSE(frame->isColor());
+        EXPECT_EQ(frame->name(), "gray");
+        const unsigned char rows[] = {0, 10, 100, 110}, taken[] = {1, 11, 101, 111};
+        EXPECT_TRUE(std::equal(rows, rows + 4, frame->grayScaleRepresentation()));
+        EXPECT_TRUE(std::equal(taken, taken + 4, picture->grayScaleRepresentation()));
+        EXPECT_EQ(device->gain(), 11u);
+        EXPECT_EQ(device->exposure(), 13u);
+        EXPECT_EQ(getenv("ORBEK_TEST_CAMERA"), nullptr);
+    }
+    EXPECT_STREQ(getenv("ORBEK_TEST_CAMERA"), "closed");
+    {
+        const CaptureDevice plain = cameraInC("plain");
+        EXPECT_EQ(*plain->release()->grayScaleRepresentation(), 0) << "the single picture is a frame";
+        EXPECT_EQ(plain->gain() + plain->exposure(), 0u);
+        unsetenv("ORBEK_TEST_CAMERA");
+    }
+    EXPECT_EQ(getenv("ORBEK_TEST_CAMERA"), nullptr);
+    const struct {
+        const char* name;
+        Rgb second, third;                                 ///< pixels
+    } colours[] = {{"bgr", {30, 40, 50}, {100, 110, 120}}, // blue first
+                   {"rgb", {50, 40, 30}, {120, 110, 100}},
+                   {"bgra", {40, 50, 60}, {100, 110, 120}}};
+    for (const auto& [name, second, third] : colours) {
+        const Image image = cameraInC(name)->capture();
+        EXPECT_TRUE(image->isColor());
+        EXPECT_EQ(image->colorRepresentation()[1], second) << name;
+        EXPECT_EQ(image->colorRepresentation()[2], third) << name;
+    }
+}
+
+TEST(CaptureDevice, WhatACameraInCDoesWrongIsTold) {
+    for (const auto& [name, what] : {std::pair{"refused", "cannot be opened: it is unplugged"},
+                                     {"silent", "cannot be opened: no reason given"},
+                                     {"empty", "has no function for images"}})
+        EXPECT_EQ(thrownBy([&] { cameraInC(name); }),
+                  std::string("FNESysError: The camera ") + name + " " + what);
+    const std::string noImage = "gives an image of ";
+    for (const auto& [name, what] : {std::pair{"dark", "gives no image: " + std::string(255, 'x')},
+                                     {"format", "gives images of the unknown format 5"},
+                                     {"wide", noImage + "11 x 2 pixels in rows of 10 bytes"},
+                                     {"huge", noImage + "2 x 65536 pixels in rows of 10 bytes"},
+                                     {"flat", noImage + "2 x 0 pixels in rows of 10 bytes"},
+                                     {"null", noImage + "2 x 2 pixels in rows of 10 bytes"}}) {
+        const CaptureDevice device = cameraInC(name);
+        EXPECT_EQ(thrownBy([&] { device->capture(); }),
+                  std::string("FNESysError: The camera ") + name + " " + what);
+    }
+}
+
 TEST(CaptureDevice, OfAnApplicationNeedsCaptureOnly) {
     class Still final : public CaptureDeviceBody {
         Image capture() override { return grayPattern(5, 4); }

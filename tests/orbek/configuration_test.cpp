@@ -2,6 +2,7 @@
 
 #include "fn/message/dialog.h"
 #include "orbek/implementation/configuration_implementation.h"
+#include "orbek/implementation/own_place.h"
 #include "support/recorded_dialog.h"
 #include "support/scratch_folder.h"
 #include "support/thrown.h"
@@ -123,6 +124,9 @@ TEST(Configuration, TellsWhichLinesAreWrong) {
          "has no effect, since ORBEK.Substitutions does not list MODELS"},
         {device + "FileLocation.Files.c = x.jpg",
          "has no effect, since " + device + "FileLocation.Files does not list c"},
+        {"ORBEK.FgDllCache.DllPaths.Prosilica = p.so", ""},
+        {"ORBEK.FgDllCache.DllPaths.WMF = p.so",
+         "has no effect, since ORBEK.FgDllCache.DllPaths does not list WMF"},
         {"ORBEK.FaceTracker.FrameRate = 25", "has no effect, since it stands in line 2 already"},
     };
     std::string text = "# comment\n";
@@ -246,8 +250,72 @@ TEST(ResourcesWithModels, FindersAreMadeOnceFromTheInstallationFolder) {
     const Orbek::Configuration configuration =
         fromText(std::string("ORBEK.Substitutions.INSTALLDIR = ") + ORBEK_BINARY_DIR + "\n");
     const auto implementation = Orbek::Configuration::Implementation::implementation(configuration);
-    EXPECT_EQ(implementation->resources().faceFinder().processingId(), "T8FF");
-    EXPECT_NO_THROW(implementation->resources().eyesFinder());
+    const Orbek::Resources& resources = implementation->resources();
+    EXPECT_EQ(resources.faceFinder().processingId(), "T8FF");
+    EXPECT_NO_THROW(resources.eyesFinder());
+    // They are not made again, which could not be done.
+    Orbek::Configuration same = configuration;
+    for (const std::string finder : {"FaceFinder", "EyesFinder"})
+        same.setValue("ORBEK." + finder + ".TemplatePath", "/no/such");
+    EXPECT_NO_THROW(resources.faceFinder());
+    EXPECT_NO_THROW(resources.eyesFinder());
+    EXPECT_EQ(resources.cmpStrategy().algorithm(), resources.cmpStrategy().algorithm());
+    EXPECT_EQ(resources.cmpStrategy().scoreMapping(), resources.cmpStrategy().scoreMapping());
+}
+
+TEST(ResourcesWithModels, SettingsReachTheEnginesThatAreMadeLater) {
+    Orbek::Configuration configuration =
+        fromText(std::string("ORBEK.Substitutions.INSTALLDIR = ") + ORBEK_BINARY_DIR + "\n");
+    const auto resources = [](const Orbek::Configuration& c) -> const Orbek::Resources& {
+        return Orbek::Configuration::Implementation::implementation(c)->resources();
+    };
+    const std::string threads = "ORBEK.ComparisonAlgorithm.NumberOfThreads",
+                      sharp = "ORBEK.ISOFullFrontalTest.MinSharpness",
+                      male = "ORBEK.FeatureTest.IsMaleThreshold";
+    for (const auto& [key, value] : {std::pair{threads, "3"}, {sharp, "0.5"}, {male, "7"}})
+        configuration.setValue(key, value);
+    EXPECT_EQ(resources(configuration).cmpStrategy().numberOfThreads(), 3u);
+    EXPECT_EQ(resources(configuration).fullFrontalTest().boundaries().minimalSharpness(), 0.5f);
+    EXPECT_EQ(resources(configuration).featureTest().boundaries().isMaleThreshold(), 7);
+    for (const std::string& key : {threads, sharp, male}) configuration.setValue(key, "1");
+    EXPECT_EQ(resources(configuration).cmpStrategy().numberOfThreads(), 3u);
+    EXPECT_EQ(resources(configuration).fullFrontalTest().boundaries().minimalSharpness(), 0.5f);
+    EXPECT_EQ(resources(configuration).featureTest().boundaries().isMaleThreshold(), 7);
+    for (const auto& [value, count] : {std::pair{"0", 1u}, {"-4", 1u}, {"2", 2u}}) {
+        const Orbek::Configuration other = fromText(
+            std::string("ORBEK.Substitutions.INSTALLDIR = " ORBEK_BINARY_DIR "\n") + threads + " = " + value);
+        EXPECT_EQ(resources(other).cmpStrategy().numberOfThreads(), count);
+        EXPECT_NE(resources(other).cmpStrategy().algorithm(),
+                  resources(configuration).cmpStrategy().algorithm());
+    }
+}
+
+TEST(Resources, DataAreFoundBesideTheLibraryWhereverItIs) {
+    const ScratchFolder scratch;
+    const auto place = [&](const std::string& file) {
+        return Orbek::dataFolderBeside(scratch.path() / file);
+    };
+    EXPECT_EQ(place("usr/lib/x86_64/liborbek.so"), std::nullopt);
+    std::filesystem::create_directories(scratch.path() / "usr/share/orbek/etc");
+    EXPECT_EQ(place("usr/lib/liborbek.so"), std::nullopt) << "a folder of that name is not enough";
+    scratch.write("usr/share/orbek/etc/SHA256SUMS", "");
+    for (const std::string file : {"usr/lib/x86_64/liborbek.so.8", "usr/lib/liborbek.so", "usr/bin/orbek"})
+        EXPECT_EQ(place(file), scratch.path() / "usr/share/orbek") << file;
+    std::filesystem::create_directories(scratch.path() / "build/etc");
+    scratch.write("build/etc/SHA256SUMS", "");
+    EXPECT_EQ(place("build/src/liborbek.so"), scratch.path() / "build");
+    EXPECT_EQ(place("build/a/b/c/d/liborbek.so"), std::nullopt) << "not from anywhere above";
+    EXPECT_EQ(Orbek::ownDataFolder(), std::filesystem::path(ORBEK_BINARY_DIR));
+
+    const Orbek::Configuration configuration = fromText("ORBEK.Substitutions.INSTALLDIR = $ORBEKDIR/x\n");
+    EXPECT_EQ(configuration.getValue("ORBEK.Substitutions.INSTALLDIR"), "$ORBEKDIR/x");
+    const auto implementation = Orbek::Configuration::Implementation::implementation(configuration);
+    EXPECT_EQ(implementation->resources()
+                  .rootComponent()
+                  .subComponent("FaceFinder")
+                  .subComponent("TemplatePath")
+                  .read(true),
+              ORBEK_BINARY_DIR "/x/etc/cara");
 }
 
 TEST(PublicHandle, FollowsTheSameRulesAsTheInnerOne) {

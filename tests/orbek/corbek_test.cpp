@@ -161,6 +161,48 @@ TEST_F(CInterfaceWithModels, RecordsComeIntoABufferOfTheirSize) {
     EXPECT_EQ(orbekInit(ORBEK_BINARY_DIR "/orbek.conf"), 0);
 }
 
+TEST_F(CInterfaceWithModels, RecordsAreMergedAndRatesTold) {
+    const Bytes first = record(alice), second = record(bob);
+    Bytes merged(1 << 16, 0xEE);
+    unsigned int size = 0;
+    const auto merge = [&](int room) {
+        return orbekMergeFIRs(first.data(), sizeOf(first), second.data(), sizeOf(second), merged.data(), room,
+                              &size);
+    };
+    EXPECT_EQ(merge(0), 3);
+    EXPECT_GT(size, sizeOf(first));
+    EXPECT_EQ(merge(static_cast<int>(size) - 1), 3);
+    EXPECT_EQ(merged, Bytes(1 << 16, 0xEE));
+    EXPECT_EQ(merge(static_cast<int>(size)), 0);
+    EXPECT_EQ(merged[size], 0xEE);
+    for (const Bytes& part : {first, second}) {
+        float score = 0;
+        EXPECT_EQ(orbekCompare(merged.data(), size, part.data(), sizeOf(part), &score), 0);
+        EXPECT_GT(score, 0.9f);
+    }
+    complaintOf([&] {
+        EXPECT_EQ(orbekMergeFIRs(first.data(), 7, second.data(), sizeOf(second), merged.data(), 9, &size), 1);
+        EXPECT_EQ(orbekMergeFIRs(first.data(), sizeOf(first), second.data(), sizeOf(second), nullptr, 1 << 20,
+                                 &size),
+                  1);
+    });
+
+    float threshold = -1, rate = -1;
+    EXPECT_EQ(orbekRequestFAR(0.001f, &threshold), 0);
+    EXPECT_NEAR(threshold, 0.5f, 0.01f);
+    EXPECT_EQ(orbekExpectedFAR(threshold, &rate), 0);
+    EXPECT_NEAR(rate, 0.001f, 1e-5f);
+    EXPECT_EQ(orbekRequestFAR(7, &threshold), 0);
+    EXPECT_EQ(threshold, 0) << "a rate of 7 counts as 1";
+    threshold = rate = 8;
+    EXPECT_EQ(complaintOf([&] { EXPECT_EQ(orbekRequestFAR(std::nanf(""), &threshold), 1); }),
+              "corbek.dll:orbekRequestFAR::error -> The false acceptance rate is not a number\n");
+    EXPECT_EQ(complaintOf([&] { EXPECT_EQ(orbekExpectedFAR(std::nanf(""), &rate), 1); }),
+              "corbek.dll:orbekExpectedFAR::error -> The threshold is not a number\n");
+    EXPECT_EQ(threshold + rate, 16) << "left alone";
+    complaintOf([&] { EXPECT_EQ(orbekRequestFAR(0, nullptr), 1); });
+}
+
 TEST_F(CInterfaceWithModels, EyesOutsideOfThePictureMakeNoRecord) {
     unsigned int size = 0;
     const auto generate = [&](float dx, float dy) {

@@ -10,6 +10,7 @@
 
 #include <cmath>
 #include <cstring>
+#include <filesystem>
 #include <functional>
 #include <sstream>
 
@@ -147,6 +148,79 @@ TEST_F(MatchingWithModels, ScoresTellRatesAndRawScores) {
     EXPECT_FLOAT_EQ(internal.convert(1000.0f), 0.25f);
     EXPECT_FLOAT_EQ(internal.convert(Score(0.25f)), 1000);
     EXPECT_EQ(Score(RawScore(3)), 3);
+}
+
+TEST_F(MatchingWithModels, PopulationsAreKeptInFiles) {
+    const Configuration c = configuration();
+    const FIRBuilder builder(c);
+    Population people(c);
+    EXPECT_EQ(people.size(), 0u);
+    for (const std::string id : {"b", "a", "b", ""}) people.append(record(builder, id.empty() ? 0 : 3), id);
+    people.append(builder.buildVoidFIR(), "nobody");
+    const std::vector<std::string> ids{"b", "a", "b", "", "nobody"};
+    EXPECT_EQ(people.size(), 5u);
+    EXPECT_EQ(people.ids(), ids);
+
+    std::stringstream stream;
+    people.save(stream);
+    const std::string bytes = stream.str();
+    stream << "more";
+    const Population read = Population::load(c, stream);
+    EXPECT_EQ(read.ids(), ids);
+    EXPECT_EQ(read.get("a").size(), people.get("a").size());
+    const FacialMatchingEngine engine(c);
+    for (const std::string id : {"b", ""})
+        EXPECT_EQ(engine.compare(read.get(id), people.get("a")),
+                  engine.compare(people.get(id), people.get("a")));
+    std::string rest;
+    EXPECT_TRUE(stream >> rest && rest == "more") << "no further than its end";
+
+    const std::string file = folder().file("people.population");
+    people.save(file);
+    EXPECT_EQ(folder().read("people.population"), bytes);
+    EXPECT_EQ(Population::load(c, file).size(), 5u);
+    // Counts and sizes of cores, most significant byte first.
+    std::ostringstream empty;
+    Population(c).save(empty);
+    EXPECT_EQ(empty.str(),
+              std::string("\0\0\0\x07\0\0\0\x04\0\0\0\x04\0\0\0\x12\0\0\0\x04\0\0\0\x04\0\0\0\x04"
+                          "\0\0\0\x04\0\0\0\x03\0\0\0\x01Orbek::Population\0\0\0\0\x01\0\0\0\x01"
+                          "\0\0\0\x01\0\0\0\0",
+                          74));
+
+    // What cannot be written leaves what was there, and nothing beside it.
+    const ScratchFolder scratch;
+    scratch.write("taken/x", "");
+    std::filesystem::create_directories(scratch.file("taken/in/the/way"));
+    for (const std::string name : {"taken", "no/such/folder"}) {
+        const std::string bad = scratch.file(name);
+        EXPECT_EQ(thrownBy([&] { people.save(bad); }).rfind("FNEIOError: " + bad + ": cannot be ", 0), 0u);
+    }
+    EXPECT_EQ(std::distance(std::filesystem::directory_iterator(scratch.path()), {}), 1);
+    Population odd(c);
+    odd.append(read.get("a"), std::string("a\0b", 3));
+    EXPECT_NE(thrownBy([&] { odd.save(stream); }), "nothing thrown");
+
+    const auto failure = [&](const std::string& content) {
+        folder().write("bad.population", content);
+        const std::string thrown = thrownBy([&] { Population::load(c, folder().file("bad.population")); }),
+                          begin = "FNEIOError: " + folder().file("bad.population") + ": ";
+        EXPECT_EQ(thrown.rfind(begin, 0), 0u) << thrown;
+        return thrown.substr(std::min(begin.size(), thrown.size()));
+    };
+    EXPECT_EQ(failure(bytes + "x"), "Population: the file does not end behind its last record");
+    EXPECT_EQ(failure(bytes.substr(0, bytes.size() - 1)).rfind("Population: no record 4 of 5: ", 0), 0u);
+    EXPECT_EQ(failure("").rfind("Population: no beginning of a population: ", 0), 0u);
+    std::string other = empty.str();
+    other[other.find("Orbek")] = 'X';
+    EXPECT_EQ(failure(other), "Population: no beginning of a population");
+    other = empty.str();
+    other[65] = 2;
+    EXPECT_EQ(failure(other), "Population: of the unknown version 2");
+    EXPECT_NE(thrownBy([&] { Population::load(c, "/no/such"); }).find("/no/such: cannot be opened"),
+              std::string::npos);
+    const Configuration b9 = configuration("ORBEK.ComparisonAlgorithm.AlgorithmVersion.B7.FIRVersion = 9\n");
+    EXPECT_NE(thrownBy([&] { Population::load(b9, file); }).find("wrong version"), std::string::npos);
 }
 
 TEST_F(MatchingWithModels, WhatIsNoNumberIsNoRateAndNoThreshold) {

@@ -3,6 +3,7 @@
 
 #include "eval/detect.h"
 #include "eval/landmarks.h"
+#include "eval/life.h"
 #include "eval/plot.h"
 #include "eval/portrait.h"
 #include "eval/recognition.h"
@@ -22,6 +23,9 @@ struct Options {
     Labelled::Selection selection;
     Eval::PeopleSelection people; ///< what only reports on recognition take
     Eval::EyeDistances eyeDistances;
+    Cmp::LifeChecker::Settings life;
+    int lifeLoss = life.lossThreshold;
+    std::vector<int> lifeThresholds{5, 10, 15, 20, 25, 30, 35, 40, 45, 50, 55, 60};
     std::string etc, finder = "orbek", settings = "Strict", json, plot;
 };
 
@@ -114,6 +118,16 @@ int identify(const Options& options) {
     return statusOf(report.failures);
 }
 
+int life(const Options& options) {
+    Cmp::LifeChecker::Settings settings = options.life;
+    settings.lossThreshold = static_cast<unsigned char>(options.lifeLoss);
+    const Eval::LifeReport report =
+        Eval::measureLife(options.etc, options.selection, options.eyeDistances, settings);
+    Eval::printLife(report, options.lifeThresholds, std::cout);
+    if (!options.json.empty()) writeFile(options.json, Eval::lifeJson(report));
+    return statusOf(report.failures);
+}
+
 CLI::App* report(CLI::App& app, const char* name, const char* doc, Options& options) {
     CLI::App* const command = app.add_subcommand(name, doc);
     Labelled::Selection& selection = options.selection;
@@ -183,10 +197,25 @@ int main(int argc, char** argv) {
     };
     CLI::App* const verifyCommand = recognition("verify", "Error rates of comparing two people");
     CLI::App* const identifyCommand = recognition("identify", "Error rates of searches in a gallery");
+    CLI::App* const lifeCommand =
+        report(app, "life", "How often the life check passes living people, and photos of them", options);
+    lifeCommand->add_option("--thresholds", options.lifeThresholds, "Thresholds to tell of")
+        ->capture_default_str();
+    lifeCommand->add_option("--loss", options.lifeLoss, "Differing bits of a pixel that do not count")
+        ->check(CLI::Range(0, 8))
+        ->capture_default_str();
+    for (const auto& [name, value] : {std::pair{"--width", &options.life.width},
+                                      {"--height", &options.life.height},
+                                      {"--template-width", &options.life.templateWidth},
+                                      {"--template-height", &options.life.templateHeight}})
+        lifeCommand
+            ->add_option(name, *value, "Pixels of the standard face, and of the window that is compared")
+            ->capture_default_str();
     CLI11_PARSE(app, argc, argv);
     try {
         if (*verifyCommand) return verify(options);
         if (*identifyCommand) return identify(options);
+        if (*lifeCommand) return life(options);
         if (*portraitCommand) return portrait(options);
         return *detectCommand ? detect(options) : eyes(options);
     } catch (const std::exception& e) {

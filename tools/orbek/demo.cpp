@@ -13,6 +13,7 @@
 
 #include <algorithm>
 #include <chrono>
+#include <fstream>
 #include <memory>
 
 namespace Orbek::Tool {
@@ -60,6 +61,16 @@ std::vector<PictureTree::Folder> peopleIn(const std::string& photos, Output& out
             people.push_back({name, {file}});
     }
     return people;
+}
+
+/// What a folder of photos tells of itself: the text of its file about.txt, if it has one.
+std::string aboutPeople(const std::string& photos) {
+    constexpr std::size_t longest = 2000;
+    std::ifstream file(fs::path(photos) / "about.txt", std::ios::binary);
+    std::string text(longest, '\0');
+    file.read(text.data(), static_cast<std::streamsize>(longest));
+    text.resize(static_cast<std::size_t>(file.gcount()));
+    return text;
 }
 
 /// Who is enrolled with which pictures, and which are kept back: of each person with several the last one,
@@ -118,6 +129,7 @@ int demonstrate(const DemoOptions& options) {
     const auto begin = std::chrono::steady_clock::now();
     Output output(options);
     Demonstration demo = plan(peopleIn(options.photos, output), options.far);
+    demo.about = aboutPeople(options.photos);
     const Configuration configuration = openConfiguration(options.configuration);
     const FIRBuilder builder(configuration);
     demo.threshold = ScoreMappings(configuration).requestFAR(options.far);
@@ -167,14 +179,14 @@ int demonstrate(const DemoOptions& options) {
             probe.score = engine.compare(*records[*probe.person], *probes[i]);
             told["claimed"] = probe.name;
             told["score"] = rounded(*probe.score, 6);
-            told["match"] = *probe.score > demo.threshold;
+            told["match"] = *probe.score >= demo.threshold;
         }
         const std::list<Match> matches = search.bestMatches(*probes[i], gallery, 0.0f, shownCandidates);
         for (const Match& match : matches) {
             const auto person = std::ranges::find(demo.people, match.name, &Demonstration::Person::name);
             probe.candidates.push_back({static_cast<std::size_t>(person - demo.people.begin()), match.score});
         }
-        const bool found = !matches.empty() && matches.front().score > demo.threshold;
+        const bool found = !matches.empty() && matches.front().score >= demo.threshold;
         told["identified"] = found ? Json(matches.front().name) : Json();
         if (found) told["candidate_score"] = rounded(matches.front().score, 6);
         output.result(told);

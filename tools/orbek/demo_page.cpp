@@ -74,7 +74,8 @@ Drawn drawingOf(const Demonstration::Picture& picture) {
 std::string barOf(Score score, Score threshold) {
     const double share = std::clamp<double>(score, 0, 1) * 100;
     return "<div class=\"bar\" aria-hidden=\"true\"><i" +
-           std::string(score > threshold ? " class=\"over\"" : "") + " style=\"width:" + Html::number(share) +
+           std::string(score >= threshold ? " class=\"over\"" : "") +
+           " style=\"width:" + Html::number(share) +
            "%\"></i><u style=\"left:" + Html::number(std::clamp<double>(threshold, 0, 1) * 100) +
            "%\"></u></div>";
 }
@@ -82,7 +83,8 @@ std::string barOf(Score score, Score threshold) {
 std::string rankOf(const std::string& thumbnail, const std::string& name, Score score, Score threshold) {
     return "<div class=\"rank\">" + thumbnail + "<span>" + Html::escaped(name) + "</span>" +
            barOf(score, threshold) + "<b>" + Html::number(score) + "</b>" +
-           (score > threshold ? Html::verdict("pass", "&#10003; match") : Html::verdict("none", "no match")) +
+           (score >= threshold ? Html::verdict("pass", "&#10003; match")
+                               : Html::verdict("none", "no match")) +
            "</div>";
 }
 
@@ -94,7 +96,7 @@ public:
         // People first, since the pictures refer to theirs.
         const std::string people = section("Enrolled", "One record was made of the pictures of each person.",
                                            "<div class=\"people\">" + all(demo_.people) + "</div>");
-        return facts() + people +
+        return about() + facts() + people +
                section(
                    "Verified and identified",
                    "These pictures were kept back. Each is compared with the record of the person that it "
@@ -113,6 +115,11 @@ private:
         return "<section><h2>" + title + "</h2><p>" + sentence + "</p>" + body + "</section>\n";
     }
 
+    std::string about() const {
+        return demo_.about.empty() ? ""
+                                   : "<section><p><b>" + Html::escaped(demo_.about) + "</b></p></section>\n";
+    }
+
     std::string facts() const {
         std::size_t pictures = demo_.probes.size(), enrolled = 0, known = 0, right = 0, strangers = 0,
                     refused = 0;
@@ -121,7 +128,7 @@ private:
             enrolled += person.enrolled;
         }
         for (const auto& probe : demo_.probes) {
-            const bool found = !probe.candidates.empty() && probe.candidates.front().score > demo_.threshold;
+            const bool found = !probe.candidates.empty() && probe.candidates.front().score >= demo_.threshold;
             if (probe.person) {
                 ++known;
                 right += found && probe.candidates.front().person == *probe.person;

@@ -36,7 +36,8 @@ struct Demonstration {
         std::vector<Candidate> candidates; ///< the records that are most like it, the best first
     };
 
-    float far = 0; ///< the false acceptance rate that is asked for
+    std::string about; ///< what is to be known of the pictures; may be empty
+    float far = 0;     ///< the false acceptance rate that is asked for
     Score threshold = 0;
     double seconds = 0; ///< that everything took
     std::vector<Person> people;

@@ -12,18 +12,21 @@ using namespace Fn::Deployment;
 
 /// An engine with its default settings but for the folder of its models.
 template <class Engine> FNCountedPtr<Engine> make(const Configuration& configuration, const char* folder) {
-    const std::string installed = Configuration::Implementation::implementation(configuration)
-                                      ->resources()
-                                      .rootComponent()
-                                      .subComponent("Substitutions")
-                                      .subComponent("INSTALLDIR")
-                                      .read(true);
     const FNCountedPtr<AppConfigDB> db(new AppVolatileConfigDB);
-    db->set("Finder.TemplatePath", installed + "/etc/" + folder);
+    db->set("Finder.TemplatePath", installationFolder(configuration) + "/etc/" + folder);
     return FNCountedPtr<Engine>(new Engine(Component(db, Property(type<Engine>(), "Finder", "", "", false))));
 }
 
 } // namespace
+
+std::string installationFolder(const Configuration& configuration) {
+    return Configuration::Implementation::implementation(configuration)
+        ->resources()
+        .rootComponent()
+        .subComponent("Substitutions")
+        .subComponent("INSTALLDIR")
+        .read(true);
+}
 
 FeatureFinders::FeatureFinders(const Configuration& configuration)
     : mouth(

@@ -2,6 +2,7 @@
 
 #include "command.h"
 #include "configuration_file.h"
+#include "feature_finders.h"
 #include "model_sums.h"
 #include "output.h"
 #include "parallel.h"
@@ -30,7 +31,7 @@ struct InstalledModels {
 /// @throws UnreadableInput naming the list
 InstalledModels installedModels(const CommonOptions& options) {
     const Configuration configuration = openConfiguration(options.configuration);
-    const fs::path folder = fs::path(configuration.getValue("ORBEK.Substitutions.INSTALLDIR")) / "etc";
+    const fs::path folder = fs::path(installationFolder(configuration)) / "etc";
     try {
         const auto sums = Models::readSums(folder / Models::sumsName);
         return {folder, {sums.begin(), sums.end()}};

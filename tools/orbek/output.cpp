@@ -39,7 +39,9 @@ std::string valueText(const Json& value) {
 
 std::string fieldText(std::string key, const Json& value) {
     std::ranges::replace(key, '_', ' ');
-    if (value.is_null() || value == false) return "no " + key;
+    const bool isThing = key == "match"; // all others tell of what the result is
+    if (value.is_null() || (value == false && isThing)) return "no " + key;
+    if (value == false) return "not " + key;
     if (value == true) return key;
     return key + " " + valueText(value);
 }

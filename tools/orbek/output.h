@@ -46,8 +46,8 @@ private:
 };
 
 /// The text of a result for people: "bob1.jpg: eyes left (87.2, 120.5, 0.99) right (139, 121, 0.98), score
-/// 0.9". The file or id comes first, null and false become "no ...", and objects of a list get lines of their
-/// own.
+/// 0.9". The file or id comes first, null becomes "no ...", false "not ...", and objects of a list get lines
+/// of their own.
 std::string readableText(const nlohmann::ordered_json& json);
 
 /// A number as results show it, with so many decimals at most.

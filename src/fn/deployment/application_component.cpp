@@ -30,8 +30,10 @@ ApplicationComponent::ApplicationComponent(int depth, const FNCountedPtr<Runtime
 
 ApplicationComponent* ApplicationComponent::makeRoot(const FNCountedPtr<AppConfigDB>& primary,
                                                      const Property& root,
-                                                     const FNCountedPtr<AppConfigDB>& secondary) {
+                                                     const FNCountedPtr<AppConfigDB>& secondary,
+                                                     const Component::Variables& given) {
     const FNCountedPtr<RuntimeResources> resources(new RuntimeResources(primary, secondary));
+    for (const auto& [name, value] : given) resources->substitutions["$" + name] = value;
     auto component = std::unique_ptr<ApplicationComponent>(
         new ApplicationComponent(0, resources, root, root.name(), {"*"}, root.readOnly()));
     component->readSubstitutions();

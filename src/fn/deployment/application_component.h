@@ -20,7 +20,8 @@ class ApplicationComponent final : public Component::Body {
 public:
     /// @throws FNEBadFunCall if `primary` is null
     static ApplicationComponent* makeRoot(const FNCountedPtr<AppConfigDB>& primary, const Property& root,
-                                          const FNCountedPtr<AppConfigDB>& secondary);
+                                          const FNCountedPtr<AppConfigDB>& secondary,
+                                          const Component::Variables& given);
 
     Property ownType() const override { return property_; }
     std::string name() const override { return name_; }

@@ -8,8 +8,8 @@
 namespace Fn::Deployment {
 
 Component::Component(const FNCountedPtr<AppConfigDB>& primary, const Property& root,
-                     const FNCountedPtr<AppConfigDB>& secondary)
-    : body_(ApplicationComponent::makeRoot(primary, root, secondary)) {}
+                     const FNCountedPtr<AppConfigDB>& secondary, const Variables& given)
+    : body_(ApplicationComponent::makeRoot(primary, root, secondary, given)) {}
 
 std::list<Component> Component::subComponents() const {
     const Type ownType = type();

@@ -4,6 +4,7 @@
 #include "fn/deployment/type.h"
 
 #include <list>
+#include <map>
 #include <string>
 
 class AppConfigDB;
@@ -20,6 +21,9 @@ namespace Fn::Deployment {
 /// A node holds no value: it asks the database (or a hook) at each read.
 class Component {
 public:
+    /// Values by names.
+    using Variables = std::map<std::string, std::string>;
+
     class Body {
     public:
         virtual ~Body() = default;
@@ -43,9 +47,10 @@ public:
     /// "Substitutions", its elements are the variables of the tree, each read once, here; a value may use
     /// those before it.
     /// @param secondary further source of defaults, may be null
+    /// @param given variables that are there before those, which may use them
     /// @throws FNEBadFunCall if `primary` is null
     Component(const FNCountedPtr<AppConfigDB>& primary, const Property& root,
-              const FNCountedPtr<AppConfigDB>& secondary = {});
+              const FNCountedPtr<AppConfigDB>& secondary = {}, const Variables& given = {});
     explicit Component(Body* body) : body_(body) {}
 
     /// The property that this node is made from.

@@ -1,5 +1,6 @@
 #include "orbek/implementation/configuration_check.h"
 
+#include "fg/capture_types.h"
 #include "fn/deployment/composite_values.h"
 #include "fn/deployment/value_check.h"
 #include "fn/text_forms.h"
@@ -90,9 +91,20 @@ private:
                 reason = "has no effect, since " + node.name() + " does not list " + part;
                 return {};
             }
+            if (node.name() == "ORBEK.FgDllCache.DllPaths" && part != "*" && !mayBePlugIn(part)) {
+                reason = "has no effect, since " + part + " is no kind of device that a plug-in drives";
+                return {};
+            }
             node = node.subComponent(part);
         }
         return node;
+    }
+
+    static bool mayBePlugIn(const std::string& kind) {
+        for (std::size_t i = 0; i < std::size(FG::frameGrabberKinds); ++i)
+            if (FG::frameGrabberKinds[i].name == kind)
+                return FG::hasLibrary(static_cast<FG::FrameGrabberEnum>(i));
+        return false;
     }
 
     /// Devices are made by their names; other elements count only if their container lists them.

@@ -7,16 +7,29 @@
 #include "fn/message/translator.h"
 #include "kx/life_checker.h"
 #include "orbek/implementation/orbek_properties.h"
+#include "orbek/implementation/own_place.h"
 
 namespace Orbek {
 
 using Fn::Deployment::Component;
 using Fn::Deployment::Property;
 
+namespace {
+
+/// $ORBEKDIR, where the library's data lie beside it.
+Component::Variables ownPlace() {
+    const auto folder = ownDataFolder();
+    return folder ? Component::Variables{{"ORBEKDIR", folder->string()}} : Component::Variables{};
+}
+
+} // namespace
+
 Resources::Resources(const FNCountedPtr<AppConfigDB>& configDb)
     : configDb_(configDb),
-      rootComponent_(configDb, Property(Fn::Deployment::type<ORBEKProperties>(), "ORBEK",
-                                        Fn::Deployment::type<ORBEKProperties>().defaultValue(), "", false)) {}
+      rootComponent_(configDb,
+                     Property(Fn::Deployment::type<ORBEKProperties>(), "ORBEK",
+                              Fn::Deployment::type<ORBEKProperties>().defaultValue(), "", false),
+                     {}, ownPlace()) {}
 
 Component Resources::rootComponent() const {
     const FNMutexLock lock(mutex_);

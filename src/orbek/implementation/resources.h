@@ -52,7 +52,7 @@ public:
     EyesFinder eyesFinder() const;
     /// The algorithm that `AlgorithmVersion` names, with its mappings.
     Cmp::Strategy cmpStrategy() const;
-    /// Portraits: the measures, and what they tell. These read no model files yet.
+    /// Portraits: the measures, and what they tell. Their model files are read when a measure needs them.
     Cmp::Portrait::Analyzer portraitAnalyzer() const;
     Kx::ISO_19794_5::FullFrontal::Test fullFrontalTest() const;
     Kx::Feature::Test featureTest() const;

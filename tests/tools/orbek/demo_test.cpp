@@ -33,6 +33,7 @@ TEST_F(DemoWithModels, PeopleAreFoundAgainByPicturesThatWereKeptBack) {
     for (const std::string name : {"alice", "bob", "erik"})
         for (const std::string number : {"1", "2", "3"})
             add(scratch, name + number, "photos/" + name + "-" + number + ".jpg");
+    fs::copy_file(ORBEK_SOURCE_DIR "/examples/images/about.txt", scratch.file("photos/about.txt"));
     const ProgramRun run = demonstrate(scratch);
     ASSERT_EQ(run.status, 0) << run.complaints;
     std::map<std::string, std::string> identified;
@@ -50,6 +51,7 @@ TEST_F(DemoWithModels, PeopleAreFoundAgainByPicturesThatWereKeptBack) {
     EXPECT_EQ(count(page, "data:image/jpeg"), 9u);
     EXPECT_EQ(count(page, "Who is it?"), 3u);
     EXPECT_NE(page.find("3 of 3"), std::string::npos);
+    EXPECT_NE(page.find("<b>The people of these pictures do not exist: they are drawn by a program"), std::string::npos);
 }
 
 TEST_F(DemoWithModels, FoldersArePeopleAndUselessPicturesAreShownAsSuch) {

@@ -64,6 +64,8 @@ TEST(PortraitToolWithModels, ItsStatusIsThatOfAllPictures) {
     EXPECT_EQ(empty.status, 1);
     EXPECT_EQ(empty.lines().at(1),
               (json{{"file", none}, {"eyes", nullptr}, {"compliant", false}, {"best_practice", false}}));
+    EXPECT_EQ(runOrbek({"portrait", "--config", config, none}).output,
+              none + ": no eyes, not compliant, not best practice\n");
     const ProgramRun unreadable = runOrbek({"portrait", "--config", config, broken, picture("alice1")});
     EXPECT_EQ(unreadable.status, 2);
     EXPECT_EQ(unreadable.complaints.rfind("orbek: " + broken + ": ", 0), 0u);
