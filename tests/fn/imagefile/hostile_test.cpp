@@ -45,6 +45,23 @@ TEST(HostileFiles, EveryTruncatedFixtureDecodesOrThrows) {
     }
 }
 
+TEST(HostileFiles, NewLimitsAreTheDefaultsOfTheProcess) {
+    const Fn::ImageLimits before;
+    EXPECT_EQ(before.maxWidth, 65535u);
+    EXPECT_EQ(before.maxHeight, 65535u);
+    EXPECT_EQ(before.maxPixels, 134217728u);
+    EXPECT_EQ(before.maxBytes, 1073741824u);
+    const std::string row = "P5 70000 1 255\n" + std::string(70000, 'x');
+    EXPECT_EQ(thrownBy([&] { Fn::readImage(row.data(), row.size()); }),
+              "FNEBadFormat: Fn::readPbm: image of 70000 x 1 pixels exceeds the limit of 65535 columns");
+    Fn::ImageLimits wide = Fn::ImageLimits::withRareVariants();
+    wide.maxWidth = 70000;
+    Fn::ImageLimits::setDefaults(wide);
+    EXPECT_EQ(Fn::readImage(row.data(), row.size()).w(), 70000u);
+    EXPECT_FALSE(Fn::ImageLimits().rareVariants) << "is asked for where it is wanted";
+    Fn::ImageLimits::setDefaults(before);
+}
+
 TEST(HostileFiles, LimitsHoldForEveryFormat) {
     for (const auto& path : fixtures()) {
         if (isRefused(path)) continue;
@@ -99,6 +116,8 @@ TEST(HostileFiles, HugeAnnouncementsCostNoMemory) {
                  big(8192, 4) + big(8192, 4) + big(0, 4) + big(0, 4) + big(1, 4) + big(1, 4))},
         {"JPEG-LS", patched(load("jpegls/t87_h3.jls"), "\xFF\xF7", 5, widestShort)},
         {"PNG", patched(load("png/gray1.png"), "IHDR", 4, widest)},
+        {"PNG text", load("png/gray1.png").substr(0, 33) + big(1u << 30, 4) + "tEXt" + "key"},
+        {"PNG of unknown chunks", load("png/gray1.png").substr(0, 33) + big(1u << 30, 4) + "abCd" + "key"},
     };
     rusage before{}, after{};
     getrusage(RUSAGE_SELF, &before);
@@ -121,6 +140,29 @@ TEST(HostileFiles, AManyScanJpegIsCutShort) {
     const RecordedDialog dialog;
     EXPECT_EQ(thrownBy([&] { Fn::readImage(many.data(), many.size()); }).substr(0, 40),
               "FNEBadArg: jpeg lib error:Too many scans");
+}
+
+TEST(HostileFiles, AGzipFileCostsTheMemoryOfItsPicture) {
+    if (!Workshop::has("gzip")) GTEST_SKIP() << "gzip is not installed";
+    const Workshop workshop;
+    workshop.write("a.pgm", "P5 1 1 255\nx");
+    workshop.run("{ cat a.pgm; head -c 200000000 /dev/zero; } | gzip -1 > a.gz");
+    rusage before{}, after{};
+    getrusage(RUSAGE_SELF, &before);
+    EXPECT_EQ(Fn::readImage(workshop.path("a.gz")).toMono8()(0, 0), 'x');
+    getrusage(RUSAGE_SELF, &after);
+    EXPECT_LT(after.ru_maxrss - before.ru_maxrss, 32 * 1024) << "KB";
+
+    // What is wrong with the gzip file tells more than what a reader makes of it.
+    const std::string whole = bytesOfFile(fixture("gzip/gray1.png.gz"));
+    workshop.write("cut.gz", whole.substr(0, whole.size() - 40));
+    EXPECT_EQ(thrownBy([&] { Fn::readImage(workshop.path("cut.gz")); }),
+              "FNEIOError: gunzip: error in gzread() with " + workshop.path("cut.gz"));
+    Fn::ImageLimits few;
+    few.maxBytes = 10;
+    EXPECT_EQ(thrownBy([&] { Fn::readImage(fixture("gzip/gray1.png.gz"), {}, few); }),
+              "FNEBadFormat: gunzip: " + fixture("gzip/gray1.png.gz") +
+                  " exceeds the limit of 10 bytes for decoding");
 }
 
 TEST(HostileFiles, AGzipBombStopsAtTheLimit) {
