@@ -33,8 +33,9 @@ public:
     const FNCountedPtr<Implementation::RatesMapping>& ratesMapping() const { return ratesMapping_; }
     unsigned int numberOfThreads() const { return numberOfThreads_; }
 
-    /// Compares probes with all records of populations, on threads of its own if there are to be several. The
-    /// number of threads makes no difference to the result.
+    /// Compares probes with all records of populations, on threads of its own if there are to be several. Of
+    /// an algorithm that compares several records at once, their number may change the last digits of scores,
+    /// since it changes which records those are; it makes no other difference.
     /// @throws what ComparisonAlgorithm::prepareFew2Many() throws; FNEGeneric if a thread fails
     MultipleProbesRawMatchingResults compareRaw(const std::list<RawProbe>& probes,
                                                 const Populations& populations) const;

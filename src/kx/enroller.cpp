@@ -23,7 +23,7 @@ bool Enroller::pushSample(int index, const SensorSample& sample) {
 }
 
 bool Enroller::push(int index, const Cmp::Sample& sample, const FNImageReference& image) {
-    const int id = builder_->pushSample(sample);
+    const int id = Implementation::pushSample(builder_, sample);
     if (id == -1) return false;
     samples_.insert(index, id, image);
     return true;

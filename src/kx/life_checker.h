@@ -7,6 +7,9 @@
 
 namespace Kx::Implementation {
 
+/// The settings "KxRecognitionLifeCheck...": keys of their own beside the tree, which all operations share.
+std::list<Fn::Deployment::Property> lifeCheckSettings();
+
 /// With the settings "KxRecognitionLifeCheck..." of a database, and the checker's own for those that it does
 /// not have. @throws FNEGeneric for a text that is no number; FNEBadArg as the checker
 FNCountedPtr<Cmp::LifeChecker> createLifeChecker(const AppConfigDB& db);

@@ -6,7 +6,7 @@ using namespace RecognitionInterest;
 
 std::optional<Cmp::FIR> recordOf(const Cmp::Strategy& strategy, const Cmp::Sample& sample) {
     const Cmp::RecordBuilder builder = strategy.algorithm()->createRecordBuilder();
-    if (builder->pushSample(sample) == -1) return {};
+    if (pushSample(builder, sample) == -1) return {};
     return builder->generate();
 }
 

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "cmp/face/face.h"
+#include "cmp/record_builder.h"
 #include "cmp/sample.h"
 #include "fn/optional.h"
 
@@ -29,5 +30,15 @@ struct SensorSample {
     Fn::Optional<FN3Vector<double>> firstEye3D; ///< in the coordinates of the 3D data; so is the next one
     Fn::Optional<FN3Vector<double>> secondEye3D;
 };
+
+namespace Implementation {
+
+/// Hands a sample to a record builder, unless its picture does not show the face that its eyes are said to be
+/// of: an eye and the middle between both have to lie in it. Far outside all faces look alike, so that
+/// records of them would match one another.
+/// @return the builder's handle, or -1 if the sample is not taken
+int pushSample(const Cmp::RecordBuilder& builder, const Cmp::Sample& sample);
+
+} // namespace Implementation
 
 } // namespace Kx

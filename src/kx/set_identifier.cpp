@@ -14,7 +14,7 @@ constexpr const char* doc = "Identifier for image sets.";
 
 SetIdentifier::SetIdentifier(const Component& component, const FaceFinder& faceFinder,
                              const EyesFinder& eyesFinder, const Cmp::Strategy& strategy)
-    : eyes_(faceFinder, eyesFinder, component, true), strategy_(strategy) {}
+    : eyes_(faceFinder, eyesFinder, component, false), strategy_(strategy) {}
 
 Type SetIdentifier::define() {
     return Type(typeId(), doc, properties(Implementation::EyeSearch::range()), "", false);

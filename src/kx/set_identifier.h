@@ -9,8 +9,8 @@ namespace Kx {
 /// matches. It keeps nothing from one call to the next, and several threads may call at the same time.
 ///
 /// For each picture it sends ProcessingSample, and then EyesFound or EyesNotFound. At last it sends the
-/// matches, best first. A picture whose eyes are known is not searched. An exception of a finder or of the
-/// algorithm leaves the call, and no event follows.
+/// matches, best first. A picture whose eyes are known is not searched; what its attributes say of eyes does
+/// not count here. An exception of a finder or of the algorithm leaves the call, and no event follows.
 class SetIdentifier : public Subject<OperationInterest::ProcessingSample, OperationInterest::EyesNotFound,
                                      OperationInterest::EyesFound, Cmp::Matches> {
 public:

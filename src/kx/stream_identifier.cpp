@@ -13,6 +13,7 @@ StreamIdentifier::StreamIdentifier(const FaceFinder& faceFinder, const EyesFinde
                                    const FNCountedPtr<FNRealTime::Clock>& clock)
     : eyes_(faceFinder, eyesFinder, component, false), strategy_(strategy),
       totalTime_(Value<Int>::get(component.subComponent("TotalTime"))),
+      lifeImagePeriod_(Value<Int>::get(component.subComponent("LifeImagePeriod"))),
       lifeChecker_(Implementation::configuredLifeChecker(component)), clock_(clock) {}
 
 Type StreamIdentifier::define() {
@@ -25,7 +26,6 @@ Type StreamIdentifier::define() {
                 "Total identification time in msecs. If time elapsed during identification exceeds this "
                 "value, identification is cancelled"),
             Implementation::useLifeCheck("Whether to perform life checks with the identification images"),
-            // Nothing waits for it yet: the source sets the pace of the life check, too.
             propertyWithDefault<Int>::create("LifeImagePeriod", 200,
                                              "Minimum duration in msecs for life check attempt. This time "
                                              "limitation is useful on fast systems.")),

@@ -28,6 +28,10 @@ public:
     void identify(const Fn::VideoSource& source, const Cmp::Population& population, Cmp::Score threshold,
                   unsigned int maxMatches) const;
 
+    /// The least time that an attempt of the life check is meant to take, milliseconds, as it is configured.
+    /// Nothing waits for it: the source sets the pace of the life check, too.
+    int lifeImagePeriod() const { return lifeImagePeriod_; }
+
     static std::string typeId() { return "Kx::StreamIdentifier"; }
     static Fn::Deployment::Type define();
 
@@ -35,6 +39,7 @@ private:
     Implementation::EyeSearch eyes_;
     Cmp::Strategy strategy_;
     int totalTime_;                              // milliseconds
+    int lifeImagePeriod_;                        // milliseconds
     FNCountedPtr<Cmp::LifeChecker> lifeChecker_; ///< null without life check
     FNCountedPtr<FNRealTime::Clock> clock_;
 };

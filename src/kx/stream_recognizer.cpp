@@ -80,7 +80,7 @@ void StreamRecognizer::recognize(const std::list<Fn::VideoSource>& sources, cons
     for (const Cmp::Face& face : faces) {
         SensorSample sample(Implementation::cachingIntensity(face.image()));
         eyes_.find(sample);
-        if (sample.hasEyes() && builder->pushSample(sample.cmpSample()) != -1) taken = true;
+        if (sample.hasEyes() && Implementation::pushSample(builder, sample.cmpSample()) != -1) taken = true;
     }
     if (!taken) FN_THROW(FNEGeneric, "Creation of FIR failed");
     recognize(sources, builder->generate(), threshold);

@@ -119,13 +119,14 @@ FNImage<unsigned char> produce(const Kind& kind, const FNImage<unsigned char>& i
 
 Cmp::Face produce(const Kind& kind, const Cmp::Face& face, float paddingRatio, const Fn::Bgra32& color) {
     const FNPos left = face.leftEye(), right = face.rightEye();
-    if (coincide(left, right)) return face;
+    const bool uncut = coincide(left, right);
     const auto picture = [&]<class T>(const FNImage<T>& image) {
         return FNImageReferenceFactory::create(
             produce(kind, image, left, right, paddingRatio,
                     Fn::convertPixel<T>(Fn::Bgra32(color.r, color.g, color.b))));
     };
     const FNImageReference token = [&] {
+        if (uncut) return face.image();
         switch (face.image().native()) {
         case FNImageReference::MONO_FLOAT:
             return picture(face.image().toMonoFloat());
@@ -138,7 +139,7 @@ Cmp::Face produce(const Kind& kind, const Cmp::Face& face, float paddingRatio, c
     }();
     const EyePlaces places = kind.eyes(static_cast<float>(token.w()), static_cast<float>(token.h()));
     if (face.hasBothEyeLocations()) {
-        const float scale = static_cast<float>(token.w()) / (4 * length(right - left));
+        const float scale = uncut ? 1 : static_cast<float>(token.w()) / (4 * length(right - left));
         const auto eye = [&](const FacialFeatureLocation& found, FNPos place) -> FacialFeatureLocation {
             return {place, found.size * scale, found.confidence};
         };

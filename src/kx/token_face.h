@@ -10,7 +10,8 @@
 ///
 /// produceImage() keeps the scale of the image, produceMinimalImage() gives 240 by 320 pixels. Where the box
 /// passes the border of the image, the picture has the padding's colour. An image whose eyes coincide is
-/// returned as it is. Any number of threads may call these functions.
+/// returned as it is, with the eyes at the places of a token image of its size. Any number of threads may
+/// call these functions.
 namespace Kx::TokenFace {
 
 /// The settings of a caller.

@@ -3,6 +3,9 @@
 #include "fn/deployment/app_file_config_db.h"
 #include "fn/deployment/composite_values.h"
 #include "fn/deployment/configurator_machine.h"
+#include "fn/deployment/value_check.h"
+#include "fn/message/dialog.h"
+#include "orbek/implementation/configuration_check.h"
 #include "orbek/implementation/configuration_implementation.h"
 
 namespace Orbek {
@@ -29,11 +32,18 @@ void collect(const Component& component, std::vector<Configuration::Setting>& se
 
 } // namespace
 
+Configuration::Implementation::Implementation(const FNCountedPtr<AppConfigDB>& db)
+    : db_(db), resources_(db), faults_(configurationFaults(db->lines(), resources_.rootComponents())) {
+    for (const Fault& fault : faults_)
+        FNDialog::warn("AppConfigDB[" + db->name() + ",line:" + std::to_string(fault.line) +
+                       "]: " + fault.key + ": " + fault.reason);
+}
+
 Configurator& Configuration::Implementation::configurator() {
     const FNMutexLock lock(configuratorMutex_);
     if (!configurator_) {
         configurator_ = FNCountedPtr<Configurator>(new ConfiguratorMachine);
-        configurator_->addRootComponent(resources_.rootComponent());
+        for (const Component& root : resources_.rootComponents()) configurator_->addRootComponent(root);
     }
     return *configurator_;
 }
@@ -66,10 +76,25 @@ void Configuration::resetToDefault(const std::string& key) {
     configurator.setValue(key, configurator.defaultValue(key));
 }
 
+void Configuration::checkValue(const std::string& key, const std::string& value) const {
+    const Type type = implementation_->configurator().property(key).type();
+    const std::string fault =
+        faultOfValue(type, withVariables(value, implementation_->resources().rootComponent()));
+    if (!fault.empty()) FN_THROW(FNEBadArg, key + ": " + fault);
+}
+
+void Configuration::flush() {
+    implementation_->db().flush();
+}
+
 std::vector<Configuration::Setting> Configuration::settings() const {
     std::vector<Setting> settings;
-    collect(implementation_->resources().rootComponent(), settings);
+    for (const Component& root : implementation_->resources().rootComponents()) collect(root, settings);
     return settings;
+}
+
+const std::vector<Configuration::Fault>& Configuration::faults() const {
+    return implementation_->faults();
 }
 
 } // namespace Orbek

@@ -49,6 +49,10 @@ const Configuration& configuration() {
     return *configurationHandle();
 }
 
+const Resources& resourcesOf(const Configuration& configuration) {
+    return Configuration::Implementation::implementation(configuration)->resources();
+}
+
 /// The live populations by their handles, which are their addresses.
 std::map<void*, FNCountedPtr<Population>>& populations() {
     static auto& instance = *new std::map<void*, FNCountedPtr<Population>>;
@@ -172,6 +176,7 @@ int orbekInit(const char* configurationFile) {
         const Face::Finder faces(configuration());
         const Eyes::Finder eyes(configuration());
         const Enrollment::Processor enrollment(configuration());
+        resourcesOf(configuration()).portraitAnalyzer().readAll();
         return done;
     });
 }
@@ -194,8 +199,7 @@ int orbekFindEyes(const char* jpeg, unsigned int jpegSize, float* x0, float* y0,
         const FNImageReference image =
             FNImageReferenceFactory::create(Fn::readJpeg(notNull(jpeg, "jpeg"), jpegSize).toMono16());
         for (const float* position : {x0, y0, x1, y1}) notNull(position, "an eye position");
-        const Resources& resources =
-            Configuration::Implementation::implementation(configuration())->resources();
+        const Resources& resources = resourcesOf(configuration());
         std::list<::FaceFinder::Location> faces;
         resources.faceFinder().find(image, faces, minRelEyeDist, maxRelEyeDist, ::FaceFinder::everywhere);
         if (faces.empty()) return noFace;

@@ -36,7 +36,7 @@ CountedPtr<std::list<Match>> FacialMatchingEngine::bestMatches(const FIR& fir, c
                                                                unsigned int maxMatches) const {
     const CountedPtr<std::list<Match>> result(new std::list<Match>);
     const std::list<Cmp::Strategy::Probe> probes{
-        {FIR::Implementation::of(fir), Cmp::Score(threshold), maxMatches}};
+        {FIR::Implementation::of(fir), thresholdOf(threshold), maxMatches}};
     const Cmp::Strategy::Results found =
         implementation_->strategy().compare(probes, Population::Implementation::of(population));
     for (const Cmp::Match& match : *found.front()) result->push_back({match.id, match.score.value()});

@@ -39,13 +39,13 @@ public:
     void process(SampleIterator first, SampleIterator last, const Score& threshold, const Feedback& feedback,
                  unsigned int maxMatches) {
         processSamples(first, last, feedback, [&](const auto& samples) {
-            setIdentifier_.identify(samples, population_, Cmp::Score(threshold), maxMatches);
+            setIdentifier_.identify(samples, population_, thresholdOf(threshold), maxMatches);
         });
     }
     void process(const CaptureDevice& device, const Score& threshold, const Feedback& feedback,
                  unsigned int maxMatches) {
         processDevice(device, feedback, [&](const auto& source) {
-            streamIdentifier_.identify(source, population_, Cmp::Score(threshold), maxMatches);
+            streamIdentifier_.identify(source, population_, thresholdOf(threshold), maxMatches);
         });
     }
 

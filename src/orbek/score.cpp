@@ -16,19 +16,21 @@ ScoreMappings& ScoreMappings::operator=(const ScoreMappings&) = default;
 ScoreMappings::~ScoreMappings() = default;
 
 Score ScoreMappings::requestFAR(float rate) const {
+    demandNumber(rate, "The false acceptance rate");
     return implementation_->strategy().ratesMapping()->requestFAR(rate).value();
 }
 
 Score ScoreMappings::requestFRR(float rate) const {
+    demandNumber(rate, "The false rejection rate");
     return implementation_->strategy().ratesMapping()->requestFRR(rate).value();
 }
 
 float ScoreMappings::expectedFAR(const Score& threshold) const {
-    return implementation_->strategy().ratesMapping()->expectedFAR(Cmp::Score(threshold));
+    return implementation_->strategy().ratesMapping()->expectedFAR(thresholdOf(threshold));
 }
 
 float ScoreMappings::expectedFRR(const Score& threshold) const {
-    return implementation_->strategy().ratesMapping()->expectedFRR(Cmp::Score(threshold));
+    return implementation_->strategy().ratesMapping()->expectedFRR(thresholdOf(threshold));
 }
 
 class InternalScoreMappings::Implementation : public Comparison {
@@ -43,11 +45,12 @@ InternalScoreMappings& InternalScoreMappings::operator=(const InternalScoreMappi
 InternalScoreMappings::~InternalScoreMappings() = default;
 
 Score InternalScoreMappings::convert(float raw) const {
-    return implementation_->strategy().scoreMapping()->convert(raw).value();
+    return implementation_->strategy().scoreMapping()->convert(demandNumber(raw, "The raw score")).value();
 }
 
 RawScore InternalScoreMappings::convert(const Score& score) const {
-    return RawScore(implementation_->strategy().scoreMapping()->convert(Cmp::Score(score)));
+    return RawScore(
+        implementation_->strategy().scoreMapping()->convert(Cmp::Score(demandNumber(score, "The score"))));
 }
 
 } // namespace Orbek

@@ -14,8 +14,8 @@ namespace Orbek::ISO_19794_5::TokenFace {
 ///     const Orbek::ISO_19794_5::TokenFace::Creator creator(configuration);
 ///     const auto [token, eyes] = creator.extractMinimal({image, eyesFinder.find(image, face).front()});
 ///
-/// An image whose eyes coincide is returned as it is. Copies share everything; any number of threads may use
-/// one creator.
+/// An image whose eyes coincide is returned as it is, with the eyes at the places of a token image. Copies
+/// share everything; any number of threads may use one creator.
 class [[gnu::visibility("default")]] Creator {
 public:
     /// @throws std::exception that names the setting that is wrong

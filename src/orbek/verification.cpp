@@ -40,13 +40,13 @@ public:
     void process(SampleIterator first, SampleIterator last, const FIR& fir, const Score& threshold,
                  const Feedback& feedback) {
         processSamples(first, last, feedback, [&](const auto& samples) {
-            setRecognizer_.recognize(samples, FIR::Implementation::of(fir), Cmp::Score(threshold));
+            setRecognizer_.recognize(samples, FIR::Implementation::of(fir), thresholdOf(threshold));
         });
     }
     void process(const CaptureDevice& device, const FIR& fir, const Score& threshold,
                  const Feedback& feedback) {
         processDevice(device, feedback, [&](const auto& source) {
-            streamRecognizer_.recognize(source, FIR::Implementation::of(fir), Cmp::Score(threshold));
+            streamRecognizer_.recognize(source, FIR::Implementation::of(fir), thresholdOf(threshold));
         });
     }
 

@@ -103,6 +103,7 @@ void fade(Bgra32& pixel, const Bgra32& color, double t, SmoothingFunction smooth
 Image vignetting(const Image& image, Rgb rgb, int borderWidth, int cornerRadius,
                  SmoothingFunction smoothing) {
     FNImage<Bgra32> result = adapt(image).toBgra32();
+    result.demandExclusiveUse(); // it may lie on pixels of the application
     const Bgra32 color(rgb.red, rgb.green, rgb.blue, rgb.alpha);
     const FNBox box = result.box();
     const Shape full(box);

@@ -190,13 +190,13 @@ TEST(MotionBlur, IsTheWayOfTheFasterEyeInEyeDistances) {
               "std::exception: motionBlur(): time delta between the frames capture times should not be zero");
 }
 
-/// Frames that tell when they were taken.
-Cmp::FaceStream stream(int frames, bool timed) {
+/// A stream of a frame for each letter; those of 't' tell when they were taken.
+Cmp::FaceStream stream(const std::string& frames) {
     Cmp::Evidence evidence("e");
-    for (int i = 0; i < frames; ++i) {
+    for (std::size_t i = 0; i < frames.size(); ++i) {
         const Fn::TimeStamp time{std::chrono::milliseconds(40 * i)};
         FNImageAttributes attributes;
-        if (timed) {
+        if (frames[i] == 't') {
             Fn::addImageCaptureTime(attributes, time);
             Fn::addImageExposureTime(attributes, 10000);
         }
@@ -212,23 +212,60 @@ TEST_F(B7Builder, TakesTheFramesOfAStreamAsOneSample) {
                                "X.SampleSelector.SampleEvaluator.RegardSimToIdeal = false\n";
     Found found = everything();
     const RecordBuilder builder = algorithm(motion, found)->createRecordBuilder();
-    EXPECT_EQ(builder->pushSample(Cmp::Sample(stream(3, true))), 0);
+    EXPECT_EQ(builder->pushSample(Cmp::Sample(stream("ttt"))), 0);
     EXPECT_EQ(builder->numberOfSamples(), 3u);
     EXPECT_EQ(builder->quality().duration, 80);
     const float still = builder->quality().mean;
     // Without times the motion is not known, which is worse than none.
     builder->clear();
     EXPECT_EQ(builder->quality().duration, 0);
-    EXPECT_EQ(builder->pushSample(Cmp::Sample(stream(3, false))), 0);
+    EXPECT_EQ(builder->pushSample(Cmp::Sample(stream("uuu"))), 0);
     EXPECT_LT(builder->quality().mean, still);
 
     found.left.confidence = 0;
-    EXPECT_EQ(algorithm(motion, found)->createRecordBuilder()->pushSample(Cmp::Sample(stream(2, true))), -1);
+    EXPECT_EQ(algorithm(motion, found)->createRecordBuilder()->pushSample(Cmp::Sample(stream("tt"))), -1);
     EXPECT_EQ(algorithm(motion + "X.SampleSelector.StrictLandmarkLocalization = false\n", found)
                   ->createRecordBuilder()
-                  ->pushSample(Cmp::Sample(stream(2, true))),
+                  ->pushSample(Cmp::Sample(stream("tt"))),
               0)
         << "one eye, mouth and bridge are enough";
+}
+
+TEST_F(B7Builder, RatesEachFrameByItsMotion) {
+    Found found = everything();
+    found.speed = {1500, 0};
+    const float m = 0.01f * 1500 / length(right - left); // of the exposure, in eye distances
+    const Algorithm made = algorithm("X.SampleSelector.SampleQualityFraction = 0\n"
+                                     "X.SampleSelector.SampleEvaluator.RegardPaddingRatio = false\n"
+                                     "X.SampleSelector.SampleEvaluator.RegardSimToIdeal = false\n",
+                                     found);
+    const SampleEvaluator evaluator({true, true, true, false, false}, 0.3f);
+    const std::pair<const char*, std::vector<float>> cases[] = {
+        {"t", {0}},
+        {"tt", {m, m}},
+        {"ttt", {m, m, m}},
+        {"u", {0.15f}},
+        {"tu", {0, 0.15f}},
+        {"tut", {0, 0.15f, 0.15f}}, // the frame before does not tell its time
+        {"tutt", {m, 0.15f, 0.15f, m}},
+        {"uutt", {0.15f, 0.15f, 0.15f, m}},
+        {"tuuttu", {m, 0.15f, 0.15f, 0.15f, m, 0.15f}},
+    };
+    for (const auto& [frames, motions] : cases) {
+        const RecordBuilder builder = made->createRecordBuilder();
+        EXPECT_EQ(builder->pushSample(Cmp::Sample(stream(frames))), 0);
+        const std::list<Fn::Package> memento = builder->createMemento();
+        const SampleSelection::Samples samples(*std::next(memento.begin(), 6));
+        const SampleSelection::Qualities qualities(*std::next(memento.begin(), 7));
+        EXPECT_EQ(samples.size(), motions.size()) << frames;
+        ASSERT_EQ(qualities.size(), motions.size()) << frames;
+        for (const auto& [quality, key] : qualities) {
+            const float expected =
+                evaluator.quality(0.5, 0, motions.at(static_cast<std::size_t>(key.frame)), 0, 0);
+            EXPECT_NEAR(quality, expected, 1e-5f) << frames << " " << key.frame;
+            EXPECT_EQ(samples.at(key).primary->quality, quality);
+        }
+    }
 }
 
 TEST_F(B7Builder, GoesOnFromItsMemento) {

@@ -272,18 +272,53 @@ TEST(MultiplyDigitized, DigitizesBetweenTheLeastAndTheGreatestElement) {
     EXPECT_EQ(thrownBy([&] { product({1, 2, 3, 4, 5}); }), "FNEBadArg: Invalid Size for digitized vector");
 }
 
-TEST(B7Transformation, ComesBackFromItsFile) {
-    std::mt19937 random(3);
+/// Of 21 raw components and 5 of a feature.
+Transformation smallTransformation(unsigned int seed) {
+    std::mt19937 random(seed);
     const auto vector = [&](std::size_t n) {
         FNVector<float> v(n);
         std::generate_n(v.getExclusive(), n, [&] { return static_cast<float>(random() % 100) / 50 - 1; });
         return v;
     };
+    const auto matrix = weights(21, 5, [&] { return static_cast<signed char>(random()); });
+    const FNVector<float> average = vector(21), translation = vector(5), base = vector(5);
+    return {0.25f, matrix, average, translation, base};
+}
+
+TEST(B7Transformation, StaysWhenItsFileChanges) {
+    const ScratchFolder folder;
+    const std::string path = folder.file("trans"), other = folder.file("other");
+    smallTransformation(3).write(path);
+    smallTransformation(4).write(other);
+    const std::string content = folder.read("trans");
+    const FNVector<float> raw(21, 0.5f);
+    const FNVector<float> expected = smallTransformation(3)(raw);
+    ASSERT_NE(smallTransformation(4)(raw), expected);
+
+    const auto overwrite = [&] { // as cp does
+        std::filesystem::copy_file(other, path, std::filesystem::copy_options::overwrite_existing);
+    };
+    const std::pair<const char*, std::function<void()>> changes[] = {
+        {"overwritten", overwrite},
+        {"cut", [&] { std::filesystem::resize_file(path, 0); }},
+        {"cut in the middle", [&] { std::filesystem::resize_file(path, 100); }},
+        {"zeroed", [&] { folder.write("trans", std::string(content.size(), '\0')); }},
+        {"removed", [&] { std::filesystem::remove(path); }},
+    };
+    for (const auto& [name, change] : changes) {
+        folder.write("trans", content);
+        const Transformation read = Transformation::read(path, 21, 5);
+        change();
+        EXPECT_EQ(read(raw), expected) << name;
+    }
+    folder.write("trans", content + std::string(1 << 20, 'x'));
+    EXPECT_EQ(Transformation::read(path, 21, 5)(raw), expected) << "what follows it does not matter";
+}
+
+TEST(B7Transformation, ComesBackFromItsFile) {
     const ScratchFolder folder;
     const std::string path = folder.file("trans");
-    Transformation{0.25f, weights(21, 5, [&] { return static_cast<signed char>(random()); }), vector(21),
-                   vector(5), vector(5)}
-        .write(path);
+    smallTransformation(3).write(path);
     const Transformation read = Transformation::read(path, 21, 5);
     EXPECT_EQ(read(read.average), read.translation) << "nothing is left of the average";
     const std::string content = folder.read("trans");
@@ -297,6 +332,12 @@ TEST(B7Transformation, ComesBackFromItsFile) {
     const std::string invalid = "FNEIOError: CmpAlgorithm: invalid ";
     EXPECT_EQ(thrown(folder.file("none"), 21, 5), "FNEIOError: CmpAlgorithm: File '" + folder.file("none") +
                                                       "' could not be opened for reading.");
+    std::filesystem::create_directory(folder.file("taken"));
+    EXPECT_EQ(thrownBy([&] { read.write(folder.file("taken")); }),
+              "FNEIOError: Cannot write the transformation '" + folder.file("taken") + "'");
+    EXPECT_FALSE(std::filesystem::exists(folder.file("taken.part")));
+    EXPECT_EQ(thrown("/dev/zero", 21, 5),
+              "FNEIOError: CmpAlgorithm: File '/dev/zero' could not be opened for reading.");
     EXPECT_EQ(thrown(path, 22, 5), invalid + "matrix package reading file '" + path + "'");
     EXPECT_EQ(thrown(path, 21, 6), "FNEIOError: PCLD: incompatible number of vector components.  Matrix cols "
                                    "= 5 EncodedFeature components = 6\n");

@@ -76,6 +76,8 @@ TEST(OverlapRemoval, TheMoreConfidentOfTwoCloseFacesStays) {
     EXPECT_EQ(kept({0, 35.9f}, 0), 1u) << "1.8 along the face";
     EXPECT_EQ(kept({0, 36.1f}, 0), 2u);
     EXPECT_EQ(kept({31.9f, 0}, 1.5707963f), 1u) << "a lying face reaches further to the side";
+    EXPECT_EQ(kept({26.4f, 19.8f}, 0.5f), 1u) << "a turned one in the direction that is its height";
+    EXPECT_EQ(kept({-26.4f, 19.8f}, 0.5f), 2u);
     Locations equal;
     equal.insert({{10, 0}, 20, 1, 0});
     equal.insert({{11, 0}, 20, 1, 0});
@@ -110,13 +112,17 @@ TEST(FrameScaleSequencer, LooksSparselyAndDenselyWhereSomethingWas) {
     sequencer.setStatus(10, 10, FrameScaleSequencer::nothing);
     sequencer.setStatus(0, 30, FrameScaleSequencer::candidate);
     sequencer.markFace({40.7f, 20.9f}, 20); // less the centre of the window: (32, 12)
-    sequencer.markFace({28, 28}, 13);       // too small a face for this level
+    sequencer.setStatus(50, 0, FrameScaleSequencer::candidate);
+    sequencer.markFace({28, 28}, 13.9f);    // too small a face for this level
+    sequencer.markFace({28, 28}, 28.1f);    // too large
+    sequencer.markFace({55.5f, 55.5f}, 27.9f);
     sequencer.finalizeFrame();
     sequencer.prepare({}, 60, 55);
     for (const auto& [x, y, dense] :
          {std::tuple{10u, 10u, false}, std::tuple{0u, 30u, true}, std::tuple{2u, 32u, true},
           std::tuple{3u, 30u, false}, std::tuple{30u, 10u, true}, std::tuple{34u, 14u, true},
-          std::tuple{35u, 14u, false}, std::tuple{19u, 19u, false}}) {
+          std::tuple{35u, 14u, false}, std::tuple{19u, 19u, false}, std::tuple{52u, 2u, true},
+          std::tuple{53u, 2u, false}, std::tuple{47u, 47u, true}}) {
         EXPECT_EQ(sequencer.isDense(x, y), dense) << x << "," << y;
         if (dense) {
             EXPECT_TRUE(visited(sequencer).contains({x, y}));

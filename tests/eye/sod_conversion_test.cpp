@@ -35,6 +35,16 @@ TEST(SodConversion, PutsBothNibblesOfAPositionIntoOneByte) {
         2048u);
 }
 
+TEST(SodConversion, TakesASingleColumnAndRefusesNone) {
+    const auto converted = [](std::uint32_t nibbles, std::uint32_t columns, std::uint32_t rows) {
+        return SodConversion::sod2csod(countingNibbles(nibbles), columns, rows,
+                                       SodConversion::SodLayout::ColumnAligned, 0xAA);
+    };
+    EXPECT_EQ(bytesOf(converted(3, 1, 3)), (std::vector<int>{0xA0, 0xA1, 0xA2, 0xAA}));
+    EXPECT_NE(thrownBy([&] { converted(0, 0, 3); }), "");
+    EXPECT_NE(thrownBy([&] { converted(0, 3, 0); }), "");
+}
+
 TEST(SodConversion, KeepsProductsWithWindows) {
     std::mt19937 random(1);
     for (int i = 0; i < 10; ++i) {

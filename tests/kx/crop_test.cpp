@@ -318,11 +318,29 @@ TEST(TokenFace, LimitsItsPadding) {
         }
 }
 
-TEST(TokenFace, AnImageWhoseEyesCoincideStaysAsItIs) {
-    const Cmp::Face portrait = face({250, 250}, {250, 250});
-    const Cmp::Face token = TokenFace::produceImage(portrait, 0, orange);
-    EXPECT_EQ(token.image().toMono16().data(), portrait.image().toMono16().data());
-    expectNear(token.leftEye(), {250, 250}, 0);
+TEST(TokenFace, AnImageWhoseEyesCoincideStaysAsItIsAndHasTheEyesOfAToken) {
+    const Cmp::Face portrait = face({250, 250}, {250, 250}),
+                    found(portrait.image(), FaceFinder::Location{{250, 250}, 0, 0.7f, 0.1f});
+    const auto w = static_cast<float>(portrait.image().w()), h = static_cast<float>(portrait.image().h());
+    const FNPos middle(w / 2 + 0.5f, 0.453125f * h + 0.5f), aside(w / 8, 0);
+    using Produce = Cmp::Face(const Cmp::Face&, float, const Fn::Bgra32&);
+    const struct {
+        Produce* produce;
+        FNPos left, right, middle;
+    } kinds[] = {{TokenFace::produceImage, middle - aside, middle + aside, middle},
+                 {TokenFace::produceMinimalImage, {90.5f, 144.5f}, {149.5f, 144.5f}, {120.5f, 144.5f}}};
+    for (const auto& kind : kinds) {
+        const Cmp::Face token = kind.produce(portrait, 0, orange);
+        EXPECT_EQ(token.image().toMono16().data(), portrait.image().toMono16().data());
+        expectNear(token.leftEye(), kind.left, 0);
+        expectNear(token.rightEye(), kind.right, 0);
+        EXPECT_EQ(token.leftEyeLocation().confidence, portrait.leftEyeLocation().confidence);
+        EXPECT_EQ(token.rightEyeLocation().size, portrait.rightEyeLocation().size);
+        EXPECT_FALSE(token.hasFaceFinderInfo());
+        const FaceFinder::Location location = kind.produce(found, 0, orange).faceFinderLocation();
+        expectNear(location.pos, kind.middle, 0);
+        EXPECT_EQ(location.confidence, 0.7f);
+    }
 }
 
 TEST(TokenFace, RefusesEyesThatAreNoPlaces) {

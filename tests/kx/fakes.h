@@ -1,6 +1,5 @@
 #pragma once
 
-#include "support/number_records.h"
 #include "eye/eyes_finder.h"
 #include "fn/deployment/app_config_db.h"
 #include "fn/deployment/component.h"
@@ -8,6 +7,7 @@
 #include "fn/real_time.h"
 #include "fn/video_source.h"
 #include "kx/events.h"
+#include "support/number_records.h"
 
 #include <atomic>
 #include <cmath>
@@ -29,7 +29,7 @@ enum Picture : unsigned char {
 };
 
 inline FNImageReference picture(unsigned char value) {
-    FNImage<unsigned char> image(4, 3);
+    FNImage<unsigned char> image(12, 8);
     image.fill(value);
     return FNImageReferenceFactory::create(image);
 }

@@ -91,6 +91,16 @@ struct StreamIdentification {
     Log log;
 };
 
+TEST(StreamIdentifier, KeepsThePeriodOfTheLifeCheck) {
+    EXPECT_EQ(StreamIdentification().identifier.lifeImagePeriod(), 200);
+    StreamIdentification search("It.LifeImagePeriod = 7000");
+    EXPECT_EQ(search.identifier.lifeImagePeriod(), 7000);
+    search.identify({200, 200, 100}, 10, population(search.world, {{"ann", 1}}));
+    EXPECT_TRUE(search.world.clock->slept.empty()) << "the source sets the pace";
+    EXPECT_EQ(thrownBy([] { StreamIdentification("It.LifeImagePeriod = soon"); }).substr(0, 10),
+              "FNEGeneric");
+}
+
 TEST(StreamIdentifier, SearchesUntilAnImageHasMatchesOrTimeIsOver) {
     StreamIdentification search("It.TotalTime = 1000");
     const Cmp::Population people = population(search.world, {{"ann", 1}});

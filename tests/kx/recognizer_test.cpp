@@ -1,4 +1,5 @@
 #include "fakes.h"
+#include "kx/set_enroller.h"
 #include "kx/set_recognizer.h"
 #include "kx/stream_recognizer.h"
 #include "moving_face.h"
@@ -49,6 +50,40 @@ TEST(SetRecognizer, StopsAtTheFirstPictureThatIsAccepted) {
     EXPECT_EQ(log.take(), "0:100 eyes0(1,3) probe0(1) score0(nan) no0 rejected ");
     recognizer.recognize({SensorSample(picture(Nobody), leftEye, rightEye)}, record(0), threshold);
     EXPECT_EQ(log.take(), "0:0 eyes0(1,3) probe0(0) score0(1) yes0 accepted ");
+}
+
+TEST(Samples, WhoseFaceIsNotInThePictureAreNotTaken) {
+    const World world; // whose pictures have 12 x 8 pixels
+    const struct {
+        FNPos left, right;
+        bool taken;
+    } cases[] = {
+        {{1, 2}, {3, 2}, true},          {{-4, 2}, {4, 2}, true},
+        {{8, 2}, {16, 2}, true}, // to the middle
+        {{-4.1f, 2}, {4, 2}, false},     {{8, 2}, {16.1f, 2}, false},
+        {{4, -4.1f}, {4, 4}, false},     {{4, 4}, {5, 12.1f}, false},
+        {{-1, 2}, {13, 2}, false}, // larger than the picture
+        {{20, 2}, {24, 2}, false},       {{-9, 2}, {-5, 2}, false},
+        {{1, -20}, {3, -20}, false},     {{1, 1e6f}, {3, 1e6f}, false},
+        {{1e30f, 0}, {3e30f, 0}, false}, {{std::nanf(""), 2}, {3, 2}, false},
+    };
+    const SetRecognizer recognizer(settings<SetRecognizer>(), world.faceFinder(), world.eyesFinder(),
+                                   world.strategy());
+    const SetEnroller enroller(world.faceFinder(), world.eyesFinder(), world.strategy(),
+                               settings<SetEnroller>());
+    Log recognized, enrolled;
+    recognized.listenTo(recognizer);
+    enrolled.listenTo(enroller);
+    for (const auto& c : cases) {
+        const std::list<SensorSample> one{
+            SensorSample(picture(100), FacialFeatureLocation{c.left}, FacialFeatureLocation{c.right})};
+        recognizer.recognize(one, reference, threshold);
+        EXPECT_TRUE(recognized.take().ends_with(c.taken ? "yes0 accepted " : ") no0 rejected "))
+            << c.left.x << " " << c.right.x;
+        enroller.enrol(one);
+        EXPECT_TRUE(enrolled.take().ends_with(c.taken ? "record 1 " : ") failed "))
+            << c.left.x << " " << c.right.x;
+    }
 }
 
 TEST(AnnotatedSetRecognizer, TakesTheEyesAsTheyAre) {

@@ -2,6 +2,7 @@
 
 #include "fn/message/dialog.h"
 #include "orbek/implementation/configuration_implementation.h"
+#include "support/recorded_dialog.h"
 #include "support/scratch_folder.h"
 #include "support/thrown.h"
 
@@ -9,6 +10,8 @@
 
 #include <algorithm>
 #include <sstream>
+
+#include <unistd.h>
 
 namespace {
 
@@ -75,6 +78,129 @@ TEST(Configuration, RefusesUnknownKeysAndBadFiles) {
               "FNEIOError: Error opening config file [/no/such.conf] for reading");
     EXPECT_EQ(thrownBy([] { fromText("ORBEK\n"); }),
               "FNEIOError: AppConfigDB[Unnamed,line:1,column:5] syntax error, missing '='.");
+}
+
+TEST(Configuration, TellsWhichLinesAreWrong) {
+    const std::string device = "ORBEK.CaptureDevices.Door.ImageFiles.",
+                      life = "KxRecognitionLifeCheckThreshold";
+    const struct {
+        std::string line;
+        std::string reason; ///< empty: nothing is wrong
+    } cases[] = {
+        {"ORBEK.FaceTracker.FrameRate = 12.5", ""},
+        {"ORBEK.Substitutions.INSTALLDIR = /opt/x", ""},
+        {"ORBEK.Substitutions = INSTALLDIR FGLIBDIR RATE", ""},
+        {"ORBEK.Substitutions.RATE = 5", ""},
+        {"ORBEK.FaceTracker.MaxAllowedFaceSpeed = $RATE", ""},
+        {device + "CaptureFrameRate = 5", ""},
+        {device + "FileLocation = Directory", ""},
+        {device + "FileLocation.Files = a b", ""},
+        {device + "FileLocation.Files.a = x.jpg", ""},
+        {device + "DeliveryFrameRate.Float = 5", ""}, // beside the choice
+        {"FNAppConfigLogAccess = no", ""},
+        {life + " = 3", ""},
+        {"ORBEK.StreamIdentifier.UseLifeCheck.default = true", ""},
+        {"*.StreamVerifier.UseLifeCheck.default = true", ""},
+        {"ORBEK.CaptureDevices.*.ImageFiles.CaptureFrameRate.default = 5", ""},
+        {"ORBEK.StreamVerifier.UseLifecheck = true",
+         "is no key of the configuration; did you mean ORBEK.StreamVerifier.UseLifeCheck?"},
+        {"ORBEKK.FaceTracker.FrameRate = 1", "is no key of the configuration; did you mean ORBEK?"},
+        {"Other = 1", "is no key of the configuration"},
+        {life + "s = 3", "is no key of the configuration; did you mean " + life + "?"},
+        {"ORBEK..FaceTracker = 1", "is no key of the configuration"},
+        {"ORBEK.FaceTracker.FrameRate.X = 1", "is no key of the configuration"},
+        {"*.StreamVerifier.UseLifeCheck = true", "is no key of the configuration"},
+        {"ORBEK.FaceTracker.FrameRates.default = 1",
+         "is no key of the configuration; did you mean ORBEK.FaceTracker.FrameRate?"},
+        {"ORBEK.FaceTracker = 1", "is a group of keys and has no value"},
+        {"ORBEK.StreamIdentifier.UseLifeCheck = yes", "\"yes\" is none of true, false"},
+        {"ORBEK.SetVerifier.EyeDistanceRange.MinEyeDistance.default = wide",
+         "\"wide\" is not of the type Float"},
+        {"ORBEK.SetVerifier.EyeDistanceRange.MinEyeDistance = $FGLIBDIR",
+         "\"lib/x86_64/\" is not of the type Float"},
+        {"ORBEK.ComparisonAlgorithm.AlgorithmVersion = B8", "\"B8\" is none of B7, B6, A14, B6L5"},
+        {"ORBEK.Substitutions.MODELS = /opt",
+         "has no effect, since ORBEK.Substitutions does not list MODELS"},
+        {device + "FileLocation.Files.c = x.jpg",
+         "has no effect, since " + device + "FileLocation.Files does not list c"},
+        {"ORBEK.FaceTracker.FrameRate = 25", "has no effect, since it stands in line 2 already"},
+    };
+    std::string text = "# comment\n";
+    std::vector<std::string> expected, warnings;
+    int number = 1;
+    for (const auto& [line, reason] : cases) {
+        text += line + "\n";
+        ++number;
+        if (reason.empty()) continue;
+        const std::string key = line.substr(0, line.find(' '));
+        expected.push_back(std::to_string(number) + " " + key + " " + reason);
+        warnings.push_back("warn: AppConfigDB[Unnamed,line:" + std::to_string(number) + "]: " + key + ": " +
+                           reason);
+    }
+    const RecordedDialog dialog;
+    const Orbek::Configuration configuration = fromText(text);
+    std::vector<std::string> told;
+    for (const auto& [line, key, reason] : configuration.faults())
+        told.push_back(std::to_string(line) + " " + key + " " + reason);
+    EXPECT_EQ(told, expected);
+    EXPECT_EQ(dialog.messages(), warnings);
+}
+
+TEST(Configuration, ChecksValuesOnlyWhenAsked) {
+    Orbek::Configuration configuration = fromText("");
+    const std::string key = "ORBEK.StreamVerifier.UseLifeCheck";
+    EXPECT_NO_THROW(configuration.checkValue(key, "true"));
+    EXPECT_EQ(thrownBy([&] { configuration.checkValue(key, "yes"); }),
+              "FNEBadArg: " + key + ": \"yes\" is none of true, false");
+    EXPECT_NO_THROW(configuration.setValue(key, "yes")) << "any text is stored";
+    EXPECT_NE(thrownBy([&] { configuration.checkValue("ORBEK.No", "1"); }), "nothing thrown");
+}
+
+TEST(Configuration, AFileThatCannotBeWrittenShows) {
+    const ScratchFolder scratch;
+    const std::string file = scratch.write("orbek.conf", ""),
+                      key = "ORBEK.ComparisonAlgorithm.NumberOfThreads";
+    const RecordedDialog dialog;
+    {
+        Orbek::Configuration configuration(file);
+        configuration.setValue(key, "2");
+        configuration.flush();
+        EXPECT_EQ(scratch.read("orbek.conf"), key + " = 2\n");
+        std::filesystem::remove(file + ".bak");
+        std::filesystem::create_directories(file + ".bak/x");
+        configuration.setValue(key, "3"); // returns before it is tried
+        EXPECT_EQ(thrownBy([&] { configuration.flush(); }).rfind("FNEIOError: Error removing backup", 0), 0u);
+        EXPECT_NE(thrownBy([&] { configuration.setValue(key, "4"); }), "nothing thrown");
+    }
+    EXPECT_EQ(dialog.messages().size(), 1u);
+    EXPECT_EQ(scratch.read("orbek.conf"), key + " = 2\n");
+    EXPECT_FALSE(std::filesystem::exists(file + "-" + std::to_string(getpid()) + ".tmp"));
+}
+
+TEST(Configuration, TheNumbersOfTheLifeCheckAreSettings) {
+    Orbek::Configuration configuration = fromText("KxRecognitionLifeCheckWidth = 20\n");
+    const std::string prefix = "KxRecognitionLifeCheck";
+    const std::pair<const char*, const char*> defaults[] = {
+        {"Width", "14"},          {"Height", "14"},        {"RelEyeDist", "1.2"},
+        {"RelUp", "0.1"},         {"TemplateWidth", "12"}, {"TemplateHeight", "12"},
+        {"Threshold", "50"},      {"LossThreshold", "2"},  {"TranslationThreshold", "0.8"},
+        {"ScaleThreshold", "1.2"}};
+    const auto settings = configuration.settings();
+    for (const auto& [name, value] : defaults) {
+        const auto setting = std::ranges::find(settings, prefix + name, &Orbek::Configuration::Setting::key);
+        ASSERT_NE(setting, settings.end()) << name;
+        EXPECT_EQ(setting->defaultValue, value) << name;
+        EXPECT_FALSE(setting->description.empty());
+        configuration.setValue(prefix + name, "9");
+        EXPECT_EQ(configuration.getValue(prefix + name), "9");
+    }
+    const auto threshold =
+        std::ranges::find(settings, prefix + "Threshold", &Orbek::Configuration::Setting::key);
+    EXPECT_EQ(threshold->type, "Int");
+    EXPECT_EQ(threshold->description,
+              "Threshold (integer value) to be used for the life check discriminator (default: 50).");
+    configuration.resetToDefault(prefix + "Threshold");
+    EXPECT_EQ(configuration.getValue(prefix + "Threshold"), "50");
 }
 
 TEST(Configuration, ListsEverySetting) {

@@ -66,7 +66,7 @@ TEST(PortraitCreators, ReturnAnImageWhoseEyesCoincide) {
     const Image image = grayPattern(30, 20);
     const auto [token, tokenEyes] = TokenFace::Creator(settings("")).extract({image, {{5, 5}, {5, 5}, 0, 0}});
     EXPECT_EQ(token->grayScaleRepresentation(), image->grayScaleRepresentation());
-    EXPECT_EQ(tokenEyes.first, (Position{5, 5}));
+    EXPECT_EQ(tokenEyes.first, (Position{11.75f, 9.5625f})) << "where a token image of 30 x 20 has it";
 }
 
 } // namespace

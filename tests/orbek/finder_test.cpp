@@ -41,6 +41,24 @@ TEST(Finders, NeedTheirModelsWhenTheyAreMade) {
               "FNEOutOfRange: Face tracker configuration: frame rate out of range!");
 }
 
+TEST(FindersWithModels, RefuseToLookAtHardlyAnything) {
+    const std::string key = ".StreamingSubsamplingWidth";
+    const auto thrown = [&](const std::string& finder, const std::string& width) {
+        const Configuration c = installed(ORBEK_BINARY_DIR, finder + key + " = " + width + "\n");
+        return thrownBy([&] {
+            const Face::Finder found(c);
+            const Face::Tracker tracker(c);
+        });
+    };
+    for (const std::string finder : {"ORBEK.FaceFinder", "ORBEK.FaceTracker.FaceFinder"}) {
+        for (const char* width : {"0", "64"}) EXPECT_EQ(thrown(finder, width), "nothing thrown");
+        for (const char* width : {"65", "65536", "4294967295"}) {
+            const std::string reason = finder + key + ": " + width + " is no width for subsampling, 0 to 64";
+            EXPECT_TRUE(thrown(finder, width).ends_with(reason)) << thrown(finder, width);
+        }
+    }
+}
+
 TEST(FindersWithModels, AnImageWithoutAFaceGivesNothing) {
     const Configuration configuration = installed();
     const Image image = grayPattern(200, 150);

@@ -1,17 +1,26 @@
 #include "orbek/facial_matching_engine.h"
 #include "orbek/fir_builder.h"
+#include "orbek/identification.h"
 #include "orbek/implementation/comparison.h"
+#include "orbek/verification.h"
 #include "support/b7_setup.h"
 #include "support/thrown.h"
 
 #include <gtest/gtest.h>
 
+#include <cmath>
 #include <cstring>
+#include <functional>
 #include <sstream>
 
 using namespace Orbek;
 
 namespace {
+
+/// A device that nobody asks for an image.
+class Dark : public CaptureDeviceBody {
+    Image capture() override { return Image(); }
+};
 
 /// A folder with mappings from raw scores of 0 to 4000 to scores, and a projection that is not used.
 class MatchingWithModels : public B7Setup {
@@ -113,6 +122,14 @@ TEST_F(MatchingWithModels, FindsTheBestOfAPopulation) {
     EXPECT_TRUE(engine.bestMatches(probe, people, 0, 0)->empty());
     EXPECT_TRUE(engine.bestMatches(probe, people, 7, 5)->empty()) << "a threshold of 7 counts as 1";
 
+    for (const std::string threads : {"0", "-3", "1", "7"}) {
+        const FacialMatchingEngine other(
+            configuration("ORBEK.ComparisonAlgorithm.NumberOfThreads = " + threads + "\n"));
+        names.clear();
+        const auto matches = other.bestMatches(probe, same, scores[4] / 2, 10);
+        for (const Match& match : *matches) names += match.name;
+        EXPECT_EQ(names, "acba") << threads;
+    }
     EXPECT_TRUE(people.get("a") == probe);
     people.remove("a");
     EXPECT_FALSE(same.get("a") == probe);
@@ -130,6 +147,40 @@ TEST_F(MatchingWithModels, ScoresTellRatesAndRawScores) {
     EXPECT_FLOAT_EQ(internal.convert(1000.0f), 0.25f);
     EXPECT_FLOAT_EQ(internal.convert(Score(0.25f)), 1000);
     EXPECT_EQ(Score(RawScore(3)), 3);
+}
+
+TEST_F(MatchingWithModels, WhatIsNoNumberIsNoRateAndNoThreshold) {
+    const Configuration c = configuration();
+    const FIRBuilder builder(c);
+    const FIR fir = record(builder, 3);
+    Population people(c);
+    people.append(fir, "a");
+    const float nan = std::nanf("");
+    const ScoreMappings rates(c);
+    const InternalScoreMappings raw(c);
+    const FacialMatchingEngine engine(c);
+    const Verification::Processor verification(c);
+    const Identification::Processor identification(c, people);
+    const std::list<Sample> none;
+    const CaptureDevice device(new Dark);
+    const struct {
+        const char* argument;
+        std::function<void()> call;
+    } cases[] = {
+        {"The false acceptance rate", [&] { rates.requestFAR(nan); }},
+        {"The false rejection rate", [&] { rates.requestFRR(nan); }},
+        {"The threshold", [&] { rates.expectedFAR(nan); }},
+        {"The threshold", [&] { rates.expectedFRR(nan); }},
+        {"The raw score", [&] { raw.convert(nan); }},
+        {"The score", [&] { raw.convert(Score(nan)); }},
+        {"The threshold", [&] { engine.bestMatches(fir, people, nan, 5); }},
+        {"The threshold", [&] { verification.process(none.begin(), none.end(), fir, nan, {}); }},
+        {"The threshold", [&] { verification.process(device, fir, nan, {}); }},
+        {"The threshold", [&] { identification.process(none.begin(), none.end(), nan, {}, 5); }},
+        {"The threshold", [&] { identification.process(device, nan, {}, 5); }},
+    };
+    for (const auto& each : cases)
+        EXPECT_EQ(thrownBy(each.call), std::string("FNEBadArg: ") + each.argument + " is not a number");
 }
 
 TEST_F(MatchingWithModels, SamplesAreMeasuredByThePortraitAnalyzer) {
@@ -155,6 +206,13 @@ TEST(Matching, NeedsItsModelsWhenItIsFirstUsed) {
     EXPECT_EQ(thrownBy([&] { Population population(missing); }).rfind(title, 0), 0u);
     EXPECT_EQ(thrownBy([&] { InternalScoreMappings mappings(missing); }).rfind(title, 0), 0u);
     EXPECT_EQ(thrownBy([&] { FIRBuilder builder(unknown); }).rfind(title, 0), 0u);
+    for (const std::string listed : {"B6", "A14", "B6L5"}) {
+        std::istringstream text("ORBEK.ComparisonAlgorithm.AlgorithmVersion = " + listed + "\n");
+        const Configuration c(text);
+        EXPECT_EQ(thrownBy([&] { FIRBuilder builder(c); }),
+                  title + "Illegal value for Comparison Algorithm: " + listed +
+                      " is not part of this library, which has: B7");
+    }
 }
 
 } // namespace

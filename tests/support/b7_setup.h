@@ -19,6 +19,7 @@ public:
         FacialFeatureLocation left{{0, 0}, 0, 0}, right{{0, 0}, 0, 0};
         FacialFeatureLocation mouth{{0, 0}, 0, 0}, bridge{{0, 0}, 0, 0};
         Cmp::B7::PortraitMeasures portrait;
+        FNPos speed{0, 0}; ///< of the eyes, pixels in a second of capture time
     };
 
 protected:
@@ -85,11 +86,16 @@ private:
 
     struct Eyes final : EyesFinder::Body {
         explicit Eyes(const Found& found) : found_(found) {}
-        void find(const FaceFinder::Location&, const FNImageReference&, bool& foundFirst,
+        void find(const FaceFinder::Location&, const FNImageReference& image, bool& foundFirst,
                   FacialFeatureLocation& first, bool& foundSecond,
                   FacialFeatureLocation& second) const override {
             foundFirst = give(found_.left, first);
             foundSecond = give(found_.right, second);
+            const auto time = Fn::getImageCaptureTime(image.attributes());
+            if (!time.isSet()) return;
+            const FNPos moved = found_.speed * std::chrono::duration<float>(time->sinceEpoch()).count();
+            first.pos += moved;
+            second.pos += moved;
         }
         void find(const FacialFeatureLocation&, const FacialFeatureLocation&, const FNImageReference&, bool&,
                   FacialFeatureLocation&, bool&, FacialFeatureLocation&) const override {}

@@ -5,8 +5,6 @@
 #include "output.h"
 
 #include <algorithm>
-#include <charconv>
-#include <cstdint>
 #include <memory>
 
 #include <nlohmann/json.hpp>
@@ -20,6 +18,7 @@ using Setting = Configuration::Setting;
 struct ConfigOptions : CommonOptions {
     std::string key;
     std::string value;
+    std::string file; ///< to check
 };
 
 /// @throws std::runtime_error naming the key
@@ -35,24 +34,6 @@ void demandValue(const Setting& setting) {
     if (!setting.hasValue) throw std::runtime_error(setting.key + ": is a group of keys and has no value");
 }
 
-template <class T> bool isNumber(const std::string& text) {
-    T value{};
-    const char* const end = text.data() + text.size();
-    const auto [parsed, error] = std::from_chars(text.data(), end, value);
-    return error == std::errc() && parsed == end;
-}
-
-/// What is no value is told now, and not when an engine is made.
-void demandFitting(const Setting& setting, const std::string& value) {
-    const std::string& type = setting.type;
-    const bool fits = type == "Bool"    ? value == "true" || value == "false"
-                      : type == "Float" ? isNumber<float>(value)
-                      : type == "Int"   ? isNumber<std::int32_t>(value)
-                      : type == "UInt"  ? isNumber<std::uint32_t>(value)
-                                        : true;
-    if (!fits) throw std::runtime_error(setting.key + ": \"" + value + "\" is not of the type " + type);
-}
-
 int get(const ConfigOptions& options) {
     const Configuration configuration = openConfiguration(options.configuration);
     demandValue(settingOf(configuration, options.key));
@@ -63,13 +44,23 @@ int get(const ConfigOptions& options) {
 
 int set(const ConfigOptions& options) {
     const std::string file = configurationFile(options.configuration);
-    const Setting setting = settingOf(openConfiguration(file), options.key);
-    demandValue(setting);
-    demandFitting(setting, options.value);
-    Configuration(file).setValue(options.key, options.value); // writes the file at its end
-    if (openConfiguration(file).getValue(options.key) != options.value)
-        throw std::runtime_error(file + ": cannot be written");
+    const Configuration present = openConfiguration(file, options.key);
+    demandValue(settingOf(present, options.key));
+    present.checkValue(options.key, options.value);
+    Configuration changed(file);
+    changed.setValue(options.key, options.value);
+    changed.flush();
     return done;
+}
+
+int check(const ConfigOptions& options) {
+    const std::string file = configurationFile(options.file.empty() ? options.configuration : options.file);
+    const std::vector<Configuration::Fault> faults = readConfiguration(file).faults();
+    Output output(options);
+    for (const auto& [line, key, reason] : faults)
+        output.result({{"file", file}, {"line", line}, {"key", key}, {"reason", reason}},
+                      file + ": line " + std::to_string(line) + ": " + key + ": " + reason);
+    return faults.empty() ? done : failed;
 }
 
 int list(const ConfigOptions& options) {
@@ -131,6 +122,14 @@ std::vector<Command> configCommands(CLI::App& program) {
         command("explain", "Tell what a key means.", explain)};
     for (const Command& made : commands) addKey(made)->required(made.app->get_name() != "list");
     commands[1].app->add_option("value", options->value, "Value")->required()->type_name("VALUE");
+    commands.push_back(command("check",
+                               "Tell which lines of a configuration file are wrong.\n"
+                               "These are unknown keys, keys that come twice, and values that are none.\n"
+                               "Exit status: 0 nothing is wrong, 1 something is.",
+                               check));
+    commands.back()
+        .app->add_option("file", options->file, "Configuration file; --config or the installed one otherwise")
+        ->type_name("FILE");
     return commands;
 }
 

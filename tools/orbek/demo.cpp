@@ -209,9 +209,7 @@ Command demoCommand(CLI::App& program) {
                     "Folder for index.html and people.gallery, which are replaced")
         ->type_name("DIR")
         ->capture_default_str();
-    app->add_option("--far", options->far, "Share of other people that may be taken for a person")
-        ->check(CLI::Range(0.0f, 1.0f))
-        ->capture_default_str();
+    addShare(*app, "--far", options->far, "Share of other people that may be taken for a person");
     addJobs(*app, options->jobs);
     return {app, [options] { return demonstrate(*options); }};
 }

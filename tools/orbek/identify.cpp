@@ -63,10 +63,8 @@ Command identifyCommand(CLI::App& program) {
     app->add_option("--top", options->top, "Matches to list at most")
         ->check(CLI::Range(1u, 1000000u))
         ->capture_default_str();
-    app->add_option("--far", options->far,
-                    "Share of other people's records that may be taken for the person's")
-        ->check(CLI::Range(0.0f, 1.0f))
-        ->capture_default_str();
+    addShare(*app, "--far", options->far,
+             "Share of other people's records that may be taken for the person's");
     addJobs(*app, options->jobs);
     return {app, [options] { return identify(*options); }, undecided};
 }

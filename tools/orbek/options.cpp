@@ -8,6 +8,22 @@
 #include <CLI/CLI.hpp>
 
 namespace Orbek::Tool {
+namespace {
+
+/// What CLI::Range takes for one, "nan" is no share.
+std::string complaintOfShare(const std::string& text) {
+    float share = 0;
+    const bool number = CLI::detail::lexical_cast(text, share);
+    return number && share >= 0 && share <= 1 ? "" : "\"" + text + "\" is not a number from 0 to 1";
+}
+
+template <class Share>
+CLI::Option* add(CLI::App& command, const std::string& name, Share& share, const std::string& description) {
+    return command.add_option(name, share, description)
+        ->check(CLI::Validator(complaintOfShare, "FLOAT in [0 - 1]"));
+}
+
+} // namespace
 
 namespace {
 
@@ -64,6 +80,16 @@ void addJobs(CLI::App& command, unsigned int& jobs) {
     command.add_option("--jobs", jobs, "Threads that share the work; one for each processor otherwise")
         ->type_name("N")
         ->check(CLI::Range(1u, 1024u));
+}
+
+CLI::Option* addShare(CLI::App& command, const std::string& name, float& share,
+                      const std::string& description) {
+    return add(command, name, share, description)->capture_default_str();
+}
+
+CLI::Option* addShare(CLI::App& command, const std::string& name, std::optional<float>& share,
+                      const std::string& description) {
+    return add(command, name, share, description);
 }
 
 } // namespace Orbek::Tool

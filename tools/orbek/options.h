@@ -1,5 +1,6 @@
 #pragma once
 
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -7,7 +8,8 @@
 
 namespace CLI {
 class App;
-}
+class Option;
+} // namespace CLI
 
 namespace Orbek::Tool {
 
@@ -29,5 +31,11 @@ void addImages(CLI::App& command, std::vector<std::string>& images,
                const std::string& description = "Image files, or folders of them; - for standard input");
 /// Adds how many threads share the work: as many as there are processors, unless told otherwise.
 void addJobs(CLI::App& command, unsigned int& jobs);
+
+/// Adds an option for a rate or a score: a number from 0 to 1, and nothing that is no number.
+CLI::Option* addShare(CLI::App& command, const std::string& name, float& share,
+                      const std::string& description);
+CLI::Option* addShare(CLI::App& command, const std::string& name, std::optional<float>& share,
+                      const std::string& description);
 
 } // namespace Orbek::Tool

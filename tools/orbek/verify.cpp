@@ -60,10 +60,8 @@ Command verifyCommand(CLI::App& program) {
                    *options);
     app->add_option("record", options->record, "File of the record")->required()->type_name("FILE");
     addImages(*app, options->images);
-    CLI::Option* const score = app->add_option("--score", options->score, "Least score of a match, 0 to 1");
-    app->add_option("--far", options->far, "Share of other people that may be taken for the person")
-        ->check(CLI::Range(0.0f, 1.0f))
-        ->capture_default_str()
+    CLI::Option* const score = addShare(*app, "--score", options->score, "Least score of a match");
+    addShare(*app, "--far", options->far, "Share of other people that may be taken for the person")
         ->excludes(score);
     return {app, [options] { return verify(*options); }, undecided};
 }

@@ -93,7 +93,7 @@ int FeatureSetBuilder::push(Face const& face, int id, int frameIndex, FN2Vector<
     if (core_->settings().selector.strictLandmarks && !annotated.hasBothEyeLocations()) return -1;
     Fn::Optional<FNImage<float>> warped;
     const Measures measures = measure(annotated, warped);
-    const float moved = motion(annotated, offset, measures);
+    const float moved = motion({id, frameIndex}, annotated, offset, measures);
     const float quality = rate(measures, moved);
     if (selection_.tryAddSample({id, frameIndex}, quality,
                                 SampleEntryValue(PrimaryData(warped, annotated, quality))))
@@ -156,13 +156,15 @@ FeatureSetBuilder::Measures FeatureSetBuilder::measure(const Face& face,
 }
 
 /// The motion of a face since the sample before, which is the last one that was kept.
-float FeatureSetBuilder::motion(const Face& face, FN2Vector<float> offset, const Measures& measures) {
+float FeatureSetBuilder::motion(const SampleEntryKey& key, const Face& face, FN2Vector<float> offset,
+                                const Measures& measures) {
     if (!core_->settings().selector.evaluator.regarded().motionBlurStrength) return unknownMotion;
     const Exposure exposure(face.image());
     if (!exposure.known()) return unknownMotion;
     if (numberOfSamples() == 0) {
         pendingFirst_ = true;
         pending_ = measures;
+        pendingKey_ = key;
         return 0;
     }
     const SampleEntryValue& last = selection_.samples().rbegin()->second;
@@ -178,14 +180,16 @@ float FeatureSetBuilder::motion(const Face& face, FN2Vector<float> offset, const
     return moved;
 }
 
-/// Rates the frame that has waited.
+/// Rates the frame that has waited, unless others have taken its place.
 void FeatureSetBuilder::rateFirst(float motion) {
     pendingFirst_ = false;
-    const auto [key, value] = *selection_.samples().rbegin();
+    const auto first = selection_.samples().find(pendingKey_);
+    if (first == selection_.samples().end()) return;
+    const PrimaryData data = *first->second.primary;
     const float quality = rate(pending_, motion);
-    selection_.removeSample(key.handle);
-    selection_.tryAddSample(
-        key, quality, SampleEntryValue(PrimaryData(value.primary->warped, value.primary->face, quality)));
+    selection_.removeFrame(pendingKey_);
+    selection_.tryAddSample(pendingKey_, quality,
+                            SampleEntryValue(PrimaryData(data.warped, data.face, quality)));
 }
 
 float FeatureSetBuilder::rate(const Measures& measures, float motion) const {
@@ -245,6 +249,7 @@ void FeatureSetBuilder::setMemento(const Fn::Package& package) {
     selection_.restore(samples, qualities);
     nextSampleId_ = nextSampleId;
     pendingFirst_ = pendingFirst && !samples.empty();
+    if (pendingFirst_) pendingKey_ = samples.begin()->first; // the only one
     pending_ = pending;
     quality_ = quality;
 }

@@ -44,14 +44,16 @@ private:
     int push(FaceStream const& stream, int id);
     int annotateLandmarks(Face& face) const;
     Measures measure(const Face& face, Fn::Optional<FNImage<float>>& warped) const;
-    float motion(const Face& face, FN2Vector<float> offset, const Measures& measures);
+    float motion(const SampleEntryKey& key, const Face& face, FN2Vector<float> offset,
+                 const Measures& measures);
     void rateFirst(float motion);
     float rate(const Measures& measures, float motion) const;
 
     FNCountedPtr<const Core> core_;
     int nextSampleId_ = 0;
-    bool pendingFirst_ = false; ///< the only frame so far waits for the next one, which tells its motion
-    Measures pending_;          ///< of that frame
+    bool pendingFirst_ = false; ///< the first frame waits for two that tell its motion
+    Measures pending_;          ///< of that frame; so is the next one
+    SampleEntryKey pendingKey_;
     SampleSelection selection_;
     Quality quality_;
 };

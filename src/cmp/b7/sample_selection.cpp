@@ -70,6 +70,11 @@ void SampleSelection::removeSample(int handle) {
     std::erase_if(qualities_, [&](const auto& quality) { return quality.second.handle == handle; });
 }
 
+void SampleSelection::removeFrame(const SampleEntryKey& key) {
+    samples_.erase(key);
+    std::erase_if(qualities_, [&](const auto& quality) { return quality.second == key; });
+}
+
 void SampleSelection::clear() {
     samples_.clear();
     qualities_.clear();

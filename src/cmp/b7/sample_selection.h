@@ -68,6 +68,7 @@ public:
     bool tryAddSample(SampleEntryKey const& key, float quality, SampleEntryValue const& value);
     /// Forgets all frames of a sample.
     void removeSample(int handle);
+    void removeFrame(const SampleEntryKey& key);
     void clear();
     /// Takes over what samples() and qualities() gave. @throws FNEBadArg if they do not fit each other
     void restore(const Samples& samples, const Qualities& qualities);

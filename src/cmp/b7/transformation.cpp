@@ -2,10 +2,10 @@
 
 #include "fn/byte_order.h"
 
+#include <cerrno>
 #include <filesystem>
 #include <fstream>
 #include <optional>
-#include <span>
 
 #include <fcntl.h>
 #include <sys/mman.h>
@@ -53,69 +53,102 @@ std::uint32_t readCount(std::istream& stream) {
     return Fn::loadUInt32(bytes);
 }
 
-/// A file where the system has it: nothing is copied, and all processes share it. It may be replaced
-/// meanwhile, but not be written over.
-class MappedFile final : public FNRMemCore::Dtor {
+/// A regular file, for reading it at once.
+class File {
 public:
-    /// @throws FNEIOError
-    explicit MappedFile(const std::string& path) {
-        const int file = ::open(path.c_str(), O_RDONLY | O_CLOEXEC);
-        struct stat status = {};
-        if (file >= 0 && ::fstat(file, &status) == 0 && S_ISREG(status.st_mode)) {
-            size_ = static_cast<std::size_t>(status.st_size);
-            if (size_ != 0) start_ = ::mmap(nullptr, size_, PROT_READ, MAP_SHARED, file, 0);
-        }
-        if (file >= 0) ::close(file);
-        if (!S_ISREG(status.st_mode) || start_ == MAP_FAILED)
-            FN_THROW(FNEIOError, "CmpAlgorithm: File '" + path + "' could not be opened for reading.");
-        if (start_) ::madvise(start_, size_, MADV_WILLNEED); // without it is slower, no more
+    /// @throws FNEIOError if there is no such regular file
+    explicit File(const std::string& path) : path_(path) {
+        handle_.file = ::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK); // nothing to wait for
+        if (handle_.file < 0 || ::fstat(handle_.file, &status_) != 0 || !S_ISREG(status_.st_mode)) fail();
     }
-    std::span<char> bytes() const { return {static_cast<char*>(start_), size_}; }
-    void del(void*) const override {} // what is left of the file stays
-    ~MappedFile() override {
-        if (start_) ::munmap(start_, size_);
+
+    /// Its first bytes, at most so many. @throws FNEIOError if it changes meanwhile
+    FNRMem<char> read(std::uint64_t most) const {
+        const auto size = std::min(most, static_cast<std::uint64_t>(status_.st_size));
+        FNRMemCore bytes(size, hugePage);
+        if (size >= hugePage) ::madvise(bytes.writable(), size, MADV_HUGEPAGE); // a quarter of the time
+        for (std::uint64_t done = 0; done < size;) {
+            const ssize_t count =
+                ::pread(handle_.file, bytes.writable() + done, size - done, static_cast<off_t>(done));
+            if (count < 0 && errno == EINTR) continue;
+            if (count < 0) fail();
+            if (count == 0) failChanged();
+            done += static_cast<std::uint64_t>(count);
+        }
+        struct stat now = {};
+        if (::fstat(handle_.file, &now) != 0 || now.st_size != status_.st_size ||
+            now.st_mtim.tv_sec != status_.st_mtim.tv_sec || now.st_mtim.tv_nsec != status_.st_mtim.tv_nsec)
+            failChanged();
+        return FNRMem<char>(bytes);
     }
 
 private:
-    void* start_ = nullptr;
-    std::size_t size_ = 0;
+    static constexpr std::uint32_t hugePage = 1 << 21;
+
+    [[noreturn]] void fail() const {
+        FN_THROW(FNEIOError, "CmpAlgorithm: File '" + path_ + "' could not be opened for reading.");
+    }
+
+    [[noreturn]] void failChanged() const {
+        FN_THROW(FNEIOError, "CmpAlgorithm: File '" + path_ + "' was changed while it was read.");
+    }
+
+    struct Handle {
+        Handle() = default;
+        ~Handle() {
+            if (file >= 0) ::close(file);
+        }
+        Handle(const Handle&) = delete;
+        Handle& operator=(const Handle&) = delete;
+        int file = -1;
+    };
+
+    std::string path_;
+    Handle handle_;
+    struct stat status_ = {};
 };
 
-/// Reads a mapped file.
-class MappedStream final : std::streambuf, public std::istream {
+/// Reads what is in memory.
+class MemoryStream final : std::streambuf, public std::istream {
 public:
-    explicit MappedStream(const FNCountedPtr<MappedFile>& file) : std::istream(this), file_(file) {
-        const std::span<char> bytes = file_->bytes();
-        setg(bytes.data(), bytes.data(), bytes.data() + bytes.size());
+    explicit MemoryStream(const FNRMem<char>& bytes) : std::istream(this), bytes_(bytes) {
+        char* const first = const_cast<char*>(bytes_.data()); // nothing is put back
+        setg(first, first, first + bytes_.size());
     }
     /// The next bytes, where they are; nothing if there are not as many.
-    std::optional<FNRMemCore> take(std::size_t size) {
+    template <class T> std::optional<FNRMem<T>> take(std::size_t size) {
         if (static_cast<std::size_t>(egptr() - gptr()) < size) return {};
-        const FNRMemCore bytes(static_cast<const void*>(gptr()), size, file_, false);
+        const FNRMem<T> all(bytes_.core());
+        const FNRMem<T> taken(all, static_cast<std::uint64_t>(gptr() - eback()), size);
         setg(eback(), gptr() + size, egptr());
-        return bytes;
+        return taken;
     }
 
 private:
-    FNCountedPtr<MappedFile> file_;
+    FNRMem<char> bytes_;
 };
 
-/// The package of a matrix, which stays in the file.
+/// What a transformation of these sizes has at most in its file, with room for the heads of packages.
+std::uint64_t greatestFile(std::uint64_t rawSize, std::uint64_t components) {
+    return rawSize * components + sizeof(float) * (rawSize + 2 * components) + 65536;
+}
+
+/// The package of a matrix, which stays where it was read.
 /// @return an empty matrix if it is not one of so many rows, or ends early
-Weights matrixIn(MappedStream& stream, std::size_t rows, std::size_t components) {
+Weights matrixIn(MemoryStream& stream, std::size_t rows, std::size_t components) {
     const std::uint32_t cores = readCount(stream), dimensions = readCount(stream), size = readCount(stream);
     const std::uint32_t storedRows = readCount(stream), cols = readCount(stream);
     if (!stream || cores != 2 || dimensions != 8 || storedRows != rows || size != std::uint64_t{rows} * cols)
         return Weights(0, 0);
     if (cols != components) return Weights(0, cols);
-    const std::optional<FNRMemCore> weights = stream.take(size);
-    return weights ? Weights(FNRMem<signed char>(*weights), rows, cols) : Weights(0, 0);
+    const std::optional<FNRMem<signed char>> weights = stream.take<signed char>(size);
+    return weights ? Weights(*weights, rows, cols) : Weights(0, 0);
 }
 
 } // namespace
 
 Transformation Transformation::read(const std::string& path, std::size_t rawSize, std::size_t components) {
-    MappedStream stream(FNCountedPtr<MappedFile>(new MappedFile(path)));
+    MemoryStream stream(File(path).read(greatestFile(rawSize, components)));
     const auto vector = [&](const char* before, std::size_t size) {
         return readPackage<FNVector<float>>(stream, path, before, "", size);
     };
@@ -141,13 +174,15 @@ void Transformation::write(std::ostream& stream) const {
 }
 
 void Transformation::write(const std::string& path) const {
-    const std::string unfinished = path + ".part"; // what others have mapped stays as it is
+    const std::string unfinished = path + ".part"; // nobody reads half of it
     std::ofstream stream(unfinished, std::ios::binary);
     write(stream);
     stream.close();
     std::error_code error;
     if (stream) std::filesystem::rename(unfinished, path, error);
-    if (!stream || error) FN_THROW(FNEIOError, "Cannot write the transformation '" + path + "'");
+    if (stream && !error) return;
+    std::filesystem::remove(unfinished, error);
+    FN_THROW(FNEIOError, "Cannot write the transformation '" + path + "'");
 }
 
 } // namespace Cmp::B7

@@ -11,8 +11,7 @@ namespace Cmp::B7 {
 /// translation. Its file holds the factor, the matrix and the vectors as packages, one behind the other.
 struct Transformation {
     float factor;
-    /// A row for each raw component, a column for each component of a feature. As read() gives it, it lies in
-    /// the file, which may be replaced but not be written over as long as the matrix is used.
+    /// A row for each raw component, a column for each component of a feature.
     Fn::Matrix<signed char> matrix;
     FNVector<float> average;     ///< of the raw vectors
     FNVector<float> translation; ///< added to features
@@ -23,8 +22,11 @@ struct Transformation {
         return multiplyDigitized(raw - average, matrix, factor, base) + translation;
     }
 
+    /// Into memory of this process: the file may change or go afterwards, as it does when a new version is
+    /// copied over it. Mapping it would cost nothing instead of 17 ms and 122 MB, but then writing to the
+    /// file changes scores in all processes, and cutting it off ends them.
     /// @param rawSize of raw vectors @param components of features
-    /// @throws FNEIOError if the file cannot be opened or does not hold what it should
+    /// @throws FNEIOError if the file cannot be opened, changes meanwhile or does not hold what it should
     static Transformation read(const std::string& path, std::size_t rawSize, std::size_t components);
     void write(std::ostream& stream) const;
     /// The same to a file, in place of what is there. @throws FNEIOError

@@ -13,6 +13,8 @@ using namespace Fn::Deployment;
 
 namespace {
 
+constexpr const char *directoryKey = "DataDir", *spharKey = "SpharTransformatorFile";
+
 Property file(const std::string& key, const std::string& name, const std::string& doc) {
     return propertyWithDefault<String>::create(key, name, doc);
 }
@@ -39,27 +41,26 @@ Component descendant(const Component& component, const std::string& path) {
 } // namespace
 
 Type Analyzer::define() {
-    return Type(
-        typeId(), "Portrait Analyzer",
-        properties(
-            file("DataDir", "$INSTALLDIR/etc/portrait", "Portrait analyzer data directory"),
-            file("GlassesDiscFile", "gldisc.dat", "Glasses discriminator data file"),
-            file("FrontalPoseDiscFile", "fpdisc.dat", "Frontal pose discriminator data file"),
-            file("ChinEstFile", "chinest.dat", "Chin estimator data file"),
-            file("CrownEstFile", "crownest.dat", "Crown estimator data file"),
-            file("LeftEarEstFile", "learest.dat", "Left ear estimator data file"),
-            file("RightEarEstFile", "rearest.dat", "Right ear estimator data file"),
-            file("GenderDiscFile", "gedisc.dat", "Gender discriminator data file"),
-            file("ClosedEyeDiscFile", "cedisc.dat", "Closed eye discriminator data file"),
-            file("GazeAwayDiscFile", "gadisc.dat", "Gaze away discriminator data file"),
-            file("EthnicityBDiscFile", "ethbdisc.dat", "Ethnicity discriminator file black"),
-            file("EthnicityWDiscFile", "ethwdisc.dat", "Ethnicity discriminator file white"),
-            file("EthnicityADiscFile", "ethadisc.dat", "Ethnicity discriminator file asian"),
-            file("OpenMouthDiscFile", "cmdisc.dat", "Open mouth discriminator data file"),
-            file("LightingUniformityDiscFile", "ludisc.dat", "Lighting uniformity discriminator data file"),
-            file("SpharTransformatorFile", "sphartr.dat", "Spherical Harmonics Transformation data file"),
-            property<AgeFiles>::create(ageFilesKey, "Data files for the age discriminator.")),
-        "", false);
+    return Type(typeId(), "Portrait Analyzer",
+                properties(file(directoryKey, "$INSTALLDIR/etc/portrait", "Portrait analyzer data directory"),
+                           file("GlassesDiscFile", "gldisc.dat", "Glasses discriminator data file"),
+                           file("FrontalPoseDiscFile", "fpdisc.dat", "Frontal pose discriminator data file"),
+                           file("ChinEstFile", "chinest.dat", "Chin estimator data file"),
+                           file("CrownEstFile", "crownest.dat", "Crown estimator data file"),
+                           file("LeftEarEstFile", "learest.dat", "Left ear estimator data file"),
+                           file("RightEarEstFile", "rearest.dat", "Right ear estimator data file"),
+                           file("GenderDiscFile", "gedisc.dat", "Gender discriminator data file"),
+                           file("ClosedEyeDiscFile", "cedisc.dat", "Closed eye discriminator data file"),
+                           file("GazeAwayDiscFile", "gadisc.dat", "Gaze away discriminator data file"),
+                           file("EthnicityBDiscFile", "ethbdisc.dat", "Ethnicity discriminator file black"),
+                           file("EthnicityWDiscFile", "ethwdisc.dat", "Ethnicity discriminator file white"),
+                           file("EthnicityADiscFile", "ethadisc.dat", "Ethnicity discriminator file asian"),
+                           file("OpenMouthDiscFile", "cmdisc.dat", "Open mouth discriminator data file"),
+                           file("LightingUniformityDiscFile", "ludisc.dat",
+                                "Lighting uniformity discriminator data file"),
+                           file(spharKey, "sphartr.dat", "Spherical Harmonics Transformation data file"),
+                           property<AgeFiles>::create(ageFilesKey, "Data files for the age discriminator.")),
+                "", false);
 }
 
 Analyzer::Analyzer(const Component& component) : implementation_(new Implementation(component)) {}
@@ -92,11 +93,19 @@ Characteristics Analyzer::analyzeGrayScale(const Face& face, const AdditionalAnn
     return Characteristics::Implementation::make(implementation_, face, false, annotations);
 }
 
-template <class Read> auto Analyzer::Implementation::readFile(const std::string& key, Read read) const {
+void Analyzer::readAll() const {
+    implementation_->readAll();
+}
+
+std::string Analyzer::Implementation::pathOf(const std::string& key) const {
     const auto text = [&](const std::string& path) {
         return Value<String>::get(descendant(component_, path));
     };
-    const std::string path = text("DataDir") + "/" + text(key);
+    return text(directoryKey) + "/" + text(key);
+}
+
+template <class Read> auto Analyzer::Implementation::readFile(const std::string& key, Read read) const {
+    const std::string path = pathOf(key);
     std::ifstream stream(path, std::ios::binary);
     if (!stream) FN_THROW(FNEIOError, "Could not open data file " + path + " for reading");
     try {
@@ -108,21 +117,23 @@ template <class Read> auto Analyzer::Implementation::readFile(const std::string&
     }
 }
 
-float Analyzer::Implementation::score(const std::string& key, const FNVector<float>& features) const {
+const Eye::SVMFPDiscriminator& Analyzer::Implementation::discriminator(const std::string& key) const {
     // Lower than any score, so that no evaluation is left early.
     constexpr double threshold = std::numeric_limits<double>::lowest();
-    const auto read = [&](std::istream& stream) {
-        Eye::SVMFPDiscriminator discriminator(stream, threshold);
-        if (discriminator.dimension() != features.size())
-            FN_THROW(FNEBadFormat, "Support vectors of " + std::to_string(discriminator.dimension()) +
-                                       " instead of " + std::to_string(features.size()) + " values");
-        return discriminator;
-    };
+    const auto read = [&](std::istream& stream) { return Eye::SVMFPDiscriminator(stream, threshold); };
     const auto slot = [&]() -> const MadeOnDemand<Eye::SVMFPDiscriminator>& {
         const FNMutexLock lock(mutex_);
         return discriminators_[key];
     };
-    const Eye::SVMFPDiscriminator& discriminator = slot().get(mutex_, [&] { return readFile(key, read); });
+    return slot().get(mutex_, [&] { return readFile(key, read); });
+}
+
+float Analyzer::Implementation::score(const std::string& key, const FNVector<float>& features) const {
+    const Eye::SVMFPDiscriminator& discriminator = this->discriminator(key);
+    if (discriminator.dimension() != features.size())
+        FN_THROW(FNEGeneric, "Error Support vectors of " + std::to_string(discriminator.dimension()) +
+                                 " instead of " + std::to_string(features.size()) +
+                                 " values when reading data file " + pathOf(key));
     double score = 0;
     discriminator(Img::FeatureVector<float>(features), score);
     return static_cast<float>(score);
@@ -134,11 +145,24 @@ float Analyzer::Implementation::age(const FNVector<float>& features) const {
     });
 }
 
-FNVector<float> Analyzer::Implementation::lightingCoefficients(const FNImage<float>& window) const {
+const SpharTransformator& Analyzer::Implementation::sphar() const {
     return sphar_.get(mutex_, [&] {
-        return readFile("SpharTransformatorFile",
-                        [](std::istream& stream) { return SpharTransformator(stream); });
-    })(window);
+        return readFile(spharKey, [](std::istream& stream) { return SpharTransformator(stream); });
+    });
+}
+
+FNVector<float> Analyzer::Implementation::lightingCoefficients(const FNImage<float>& window) const {
+    return sphar()(window);
+}
+
+void Analyzer::Implementation::readAll() const {
+    for (const Property& file : type<Analyzer>().properties())
+        if (const std::string& key = file.name();
+            key != directoryKey && key != spharKey && key != ageFilesKey)
+            discriminator(key);
+    for (const Property& file : type<AgeFiles>().properties())
+        discriminator(std::string(ageFilesKey) + "." + file.name());
+    sphar();
 }
 
 } // namespace Cmp::Portrait

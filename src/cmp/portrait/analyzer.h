@@ -29,6 +29,9 @@ public:
     static std::string typeId() { return "Cmp::Portrait::Analyzer"; }
     static Fn::Deployment::Type define();
 
+    /// Reads now what would be read when it is first needed. @throws FNEIOError, FNEGeneric naming the file
+    void readAll() const;
+
     /// In colour if the image is.
     Characteristics analyze(const Face& face) const;
     Characteristics analyzeColor(const Face& face) const;

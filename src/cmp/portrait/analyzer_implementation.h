@@ -25,8 +25,13 @@ public:
     float score(const std::string& key, const FNVector<float>& features) const;
     float age(const FNVector<float>& features) const;
     FNVector<float> lightingCoefficients(const FNImage<float>& window) const;
+    /// All files. @throws FNEIOError, FNEGeneric
+    void readAll() const;
 
 private:
+    const Eye::SVMFPDiscriminator& discriminator(const std::string& key) const;
+    const SpharTransformator& sphar() const;
+    std::string pathOf(const std::string& key) const;
     /// Calls read(stream) for the file of a key.
     template <class Read> auto readFile(const std::string& key, Read read) const;
 

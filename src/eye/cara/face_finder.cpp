@@ -116,6 +116,17 @@ std::list<Default> imposedDefaults() {
     return defaults;
 }
 
+constexpr const char* subsamplingKey = "StreamingSubsamplingWidth";
+
+/// @param setting named in the failure. @throws FNEBadArg
+std::uint32_t checkedSubsampling(std::uint32_t width, const std::string& setting) {
+    constexpr std::uint32_t most = 64; // a place is looked at every 4096th frame then
+    if (width > most)
+        FN_THROW(FNEBadArg, setting + ": " + std::to_string(width) + " is no width for subsampling, 0 to " +
+                                std::to_string(most));
+    return width;
+}
+
 } // namespace
 
 Type FaceFinder::define() {
@@ -131,9 +142,9 @@ Type FaceFinder::define() {
             property<CascadeSettings>::create("Disc3A", "Final discriminator"),
             property<String>::create("DumpFile", "Kept for older configurations"),
             propertyWithDefault<UInt>::create(
-                "StreamingSubsamplingWidth", 7u,
+                subsamplingKey, 7u,
                 "Of how many positions in a row and in a column one is looked at "
-                "in each frame of a stream, below 2 for all")),
+                "in each frame of a stream, below 2 for all; at most 64")),
         imposedDefaults(), "", false);
 }
 
@@ -189,13 +200,14 @@ FaceFinder::Impl::Impl(const Component& component)
       cascades_(cascadesOf(component.subComponent("CombinedCascades"), templatePath_)),
       disc1A_(component.subComponent("Disc1A"), templatePath_),
       disc3A_(component.subComponent("Disc3A"), templatePath_),
-      streamingSubsamplingWidth_(Value<UInt>::get(component.subComponent("StreamingSubsamplingWidth"))) {}
+      streamingSubsamplingWidth_(checkedSubsampling(Value<UInt>::get(component.subComponent(subsamplingKey)),
+                                                    component.name() + "." + subsamplingKey)) {}
 
 FaceFinder::Impl::Impl(Fn::PackageReader reader)
     : basicScaleFactor_(reader.next<float>()), templatePath_(reader.next<std::string>()),
       cascades_(reader.next<Fn::SerializableVector<CombinedCascade>>()),
       disc1A_(reader.next<SodDotDiscriminator>()), disc3A_(reader.next<GaborDiscriminator>()),
-      streamingSubsamplingWidth_(reader.next<unsigned int>()) {
+      streamingSubsamplingWidth_(checkedSubsampling(reader.next<unsigned int>(), subsamplingKey)) {
     reader.expectEnd();
 }
 

@@ -78,13 +78,20 @@ void AppConfigDB::parseLine(int lineNumber, const std::string& text,
     sink(text.substr(begin, keyEnd - begin), value);
 }
 
-AppConfigDB::Pairs AppConfigDB::parseLines(std::istream& text) const {
-    Pairs pairs;
-    const Fn::Functor2<std::string, std::string> sink(
-        [&](const std::string& key, const std::string& value) { pairs.emplace(key, value); });
-    std::string line;
-    for (int number = 1; readLine(text, line); ++number) parseLine(number, line, sink);
+std::vector<AppConfigDB::Line> AppConfigDB::parseLines(std::istream& text) const {
+    std::vector<Line> lines;
+    int number = 1;
+    const Fn::Functor2<std::string, std::string> sink([&](const std::string& key, const std::string& value) {
+        lines.push_back({number, key, value});
+    });
+    for (std::string line; readLine(text, line); ++number) parseLine(number, line, sink);
     if (text.bad()) FN_THROW(FNEIOError, "Error reading text file");
+    return lines;
+}
+
+AppConfigDB::Pairs AppConfigDB::firstPairs(const std::vector<Line>& lines) {
+    Pairs pairs;
+    for (const Line& line : lines) pairs.emplace(line.key, line.value);
     return pairs;
 }
 
@@ -92,6 +99,11 @@ const std::string& AppConfigDB::find(const Pairs& pairs, const std::string& key)
     const auto pair = pairs.find(key);
     if (pair == pairs.end()) FN_THROW(FNEBadArg, "Configuration key '" + key + "' doesn't exist");
     return pair->second;
+}
+
+AppVolatileConfigDB::AppVolatileConfigDB(std::istream& text) {
+    setLines(parseLines(text));
+    pairs_ = firstPairs(lines());
 }
 
 bool AppVolatileConfigDB::exists(const std::string& key) const {

@@ -5,6 +5,7 @@
 #include <iosfwd>
 #include <map>
 #include <string>
+#include <vector>
 
 /// A flat store of text keys and text values: the storage under the configuration tree. Keys consist of
 /// letters, digits and the characters _ . * - < > , :
@@ -14,6 +15,12 @@
 /// one stands.
 class AppConfigDB {
 public:
+    /// What one line of a configuration text says.
+    struct Line {
+        int number;
+        std::string key, value;
+    };
+
     virtual ~AppConfigDB() = default;
 
     /// The four operations throw FNEBadArg for a key with invalid characters.
@@ -27,6 +34,11 @@ public:
     virtual void refresh() = 0;
     /// A text for messages.
     virtual std::string name() const { return "Unnamed"; }
+    /// Waits until every change is in the backing store. @throws FNEIOError if one cannot get there
+    virtual void flush() {}
+
+    /// The lines that the database was last read from, in their order; not all have an effect.
+    const std::vector<Line>& lines() const { return lines_; }
 
     /// @throws FNEBadArg if a character of the key is not a key character.
     void checkKey(const char* key) const;
@@ -40,12 +52,19 @@ protected:
     /// Parses one line, and hands its pair, if it has one, to `sink`. @throws FNEIOError
     void parseLine(int lineNumber, const std::string& text,
                    const Fn::Functor2<std::string, std::string>& sink) const;
-    /// All pairs of a configuration text. A line ends at LF or CR, and one more of these behind it belongs to
-    /// the end.
+    /// All lines of a configuration text that say something. A line ends at LF or CR, and one more of these
+    /// behind it belongs to the end.
     /// @throws FNEIOError
-    Pairs parseLines(std::istream& text) const;
+    std::vector<Line> parseLines(std::istream& text) const;
+    /// The pairs that count: the first of each key.
+    static Pairs firstPairs(const std::vector<Line>& lines);
+    /// What lines() gives from now on. @param lines with values as they are meant
+    void setLines(std::vector<Line> lines) { lines_ = std::move(lines); }
     /// The value of a key, or the failure for a missing one.
     static const std::string& find(const Pairs& pairs, const std::string& key);
+
+private:
+    std::vector<Line> lines_;
 };
 
 /// Kept in memory only. Has no lock: a database that several threads change needs one outside.
@@ -53,7 +72,7 @@ class AppVolatileConfigDB final : public AppConfigDB {
 public:
     AppVolatileConfigDB() = default;
     /// Reads a configuration text. @throws FNEIOError
-    explicit AppVolatileConfigDB(std::istream& text) : pairs_(parseLines(text)) {}
+    explicit AppVolatileConfigDB(std::istream& text);
 
     bool exists(const std::string& key) const override;
     std::string get(const std::string& key) const override;

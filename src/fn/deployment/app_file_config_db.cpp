@@ -46,14 +46,29 @@ AppFileConfigDB::AppFileConfigDB(const char* fileName, bool create)
 }
 
 AppFileConfigDB::~AppFileConfigDB() {
+    waitForWriter();
+}
+
+void AppFileConfigDB::waitForWriter() const {
     constexpr useconds_t pause = 10000;
     while (token_.count() > 1) usleep(pause);
 }
 
-AppConfigDB::Pairs AppFileConfigDB::readFile() const {
+void AppFileConfigDB::flush() {
+    waitForWriter();
+    const FNMutexLock lock(mutex_);
+    if (writeFailed_) FN_THROW(FNEIOError, writeFailure_);
+}
+
+/// The pairs, in stored form.
+AppConfigDB::Pairs AppFileConfigDB::readFile() {
     std::ifstream file(fileName_);
     if (!file) FN_THROW(FNEIOError, "Error opening config file [" + fileName_ + "] for reading");
-    return parseLines(file);
+    std::vector<Line> lines = parseLines(file);
+    Pairs pairs = firstPairs(lines);
+    for (Line& line : lines) line.value = Fn::UnmapCharsFromHex(line.value, escape);
+    setLines(std::move(lines));
+    return pairs;
 }
 
 /// What every access does first; the caller holds the mutex.
@@ -105,14 +120,23 @@ void AppFileConfigDB::queueWrite() {
 }
 
 void AppFileConfigDB::writeFailed(const std::exception& failure) {
-    const FNMutexLock lock(mutex_);
-    writeFailed_ = true;
-    writeFailure_ = failure.what();
+    {
+        const FNMutexLock lock(mutex_);
+        writeFailed_ = true;
+        writeFailure_ = failure.what();
+    }
+    // Whoever made the change may never ask again.
+    FNDialog::error("Changes of the configuration are not stored: " + std::string(failure.what()));
 }
 
 void AppFileConfigDB::writeToDisk(const FNCountedPtr<char>&) {
-    writeTemporary();
-    moveIntoPlace();
+    try {
+        writeTemporary();
+        moveIntoPlace();
+    } catch (...) {
+        unlink(tmpName_.c_str());
+        throw;
+    }
 }
 
 /// Writes the pairs as they are now to the temporary file.
@@ -145,10 +169,14 @@ void AppFileConfigDB::moveIntoPlace() const {
     const FNMutexLock lock(fileMutex());
     // The old file gets its second name by a link, so that its first one never leads nowhere. Not every file
     // system has links; there it is renamed, and is missing until the next step.
-    if (link(fileName_.c_str(), bakName_.c_str()) != 0 && rename(fileName_.c_str(), bakName_.c_str()) != 0)
+    const bool linked = link(fileName_.c_str(), bakName_.c_str()) == 0;
+    if (!linked && rename(fileName_.c_str(), bakName_.c_str()) != 0)
         FN_THROW(FNEIOError,
                  "Error renaming file [" + fileName_ + "] to backup file [" + bakName_ + "]:" + systemText());
-    if (rename(tmpName_.c_str(), fileName_.c_str()) != 0)
+    if (rename(tmpName_.c_str(), fileName_.c_str()) != 0) {
+        const std::string reason = systemText();
+        if (!linked) (void)rename(bakName_.c_str(), fileName_.c_str());
         FN_THROW(FNEIOError, "Error moving temporary config file [" + tmpName_ + "] to config file [" +
-                                 fileName_ + "]:" + systemText());
+                                 fileName_ + "]:" + reason);
+    }
 }

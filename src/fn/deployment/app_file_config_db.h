@@ -13,8 +13,9 @@
 /// one.
 ///
 /// Values are stored with "%" and control characters written as "%" and two hex digits, so a "%" in a
-/// hand-written file introduces a code. After a failed write every access throws the failure until the object
-/// is made anew. May be used from several threads, and must not be destroyed on its own writer's thread.
+/// hand-written file introduces a code. A failed write leaves the file as it was and goes to FNDialog at
+/// once; after it, every access throws the failure until the object is made anew. May be used from several
+/// threads, and must not be destroyed on its own writer's thread.
 class AppFileConfigDB final : public AppConfigDB {
 public:
     /// @param create whether to make an empty file if there is none.
@@ -30,9 +31,11 @@ public:
     /// Makes changes from outside the process visible. @throws FNEIOError
     void refresh() override;
     std::string name() const override { return fileName_; }
+    void flush() override;
 
 private:
-    Pairs readFile() const;
+    Pairs readFile();
+    void waitForWriter() const;
     void beforeAccess(const char* what, const std::string& key) const;
     void queueWrite();
     void writeToDisk(const FNCountedPtr<char>& token);

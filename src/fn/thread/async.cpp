@@ -1,12 +1,30 @@
 #include "fn/thread/async.h"
 
 #include "fn/callback/composition.h"
+#include "fn/message/dialog.h"
+#include "fn/thread/thread_impl.h"
 
 namespace Fn {
 namespace {
 
 constexpr int idlePassesToLive = 20;
 constexpr unsigned long idlePause = 100; // ms
+
+/// Runs a job whose exceptions go to a handler. What goes no such way is reported: it must not end the
+/// thread, which has other jobs to run.
+/// @param runner named in the report
+void runJob(const Functor0& job, const Functor1<std::exception>& error, const char* runner) {
+    try {
+        tryCatchFunctor(job, error)();
+    } catch (const FNThreadImpl::ExitException&) {
+        FNThreadSelf::serviceCancel(); // the thread is to end, or only the job has called exit()
+    } catch (const std::exception& e) {
+        FNDialog::error(std::string(runner) + ": the error functor of a job failed: " + e.what());
+    } catch (...) {
+        if (!std::current_exception()) throw; // terminate() unwinds the stack, and must not be stopped
+        FNDialog::error(std::string(runner) + ": a job threw what is no std::exception");
+    }
+}
 
 } // namespace
 
@@ -31,11 +49,21 @@ bool AsyncBuffer::takeFirst(std::list<Job>& taken) {
 }
 
 void AsyncBuffer::run() {
+    try {
+        work();
+    } catch (...) { // however the thread ends, the next job gets a new one
+        const FNMutexLock lock(mutex_);
+        running_ = false;
+        throw;
+    }
+}
+
+void AsyncBuffer::work() {
     broadcast(false);
     std::list<Job> taken;
     for (int idlePasses = idlePassesToLive;;) {
         if (takeFirst(taken)) {
-            tryCatchFunctor(taken.front().run, taken.front().error)();
+            runJob(taken.front().run, taken.front().error, "AsyncBuffer");
             idlePasses = idlePassesToLive;
             continue;
         }
@@ -92,11 +120,10 @@ void AsyncRepeater::repeat() {
 }
 
 void AsyncRepeater::work() {
-    const Functor0 guarded = tryCatchFunctor(job_, error_);
     for (;;) {
         event_.wait();
         FNThreadSelf::serviceCancel();
-        guarded();
+        runJob(job_, error_, "AsyncRepeater");
         FNThreadSelf::serviceCancel();
     }
 }

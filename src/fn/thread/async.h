@@ -12,7 +12,8 @@
 #include <string>
 
 /// Runners of jobs in threads of their own. A std::exception of a job goes to the error functor that came
-/// with it, on the runner's thread.
+/// with it, on the runner's thread; anything else that a job throws is reported by FNDialog, or is in the
+/// state of a thread of its own. FNThreadSelf::exit() ends the job that calls it.
 
 namespace Fn {
 
@@ -33,6 +34,7 @@ private:
     };
 
     void run();
+    void work();
     bool takeFirst(std::list<Job>& taken);
 
     std::list<Job> jobs_;

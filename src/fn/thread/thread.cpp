@@ -183,10 +183,11 @@ void FNThreadImpl::join() {
     if (state_ == FNThreadState::created) FN_THROW(FNThread::InvalidState, "joining a non-started thread");
     if (joined_ && state_ != FNThreadState::running) return;
     const pthread_t thread = thread_;
-    const bool alreadyJoined = std::exchange(joined_, true);
+    const bool self = pthread_equal(thread, pthread_self()); // refused, and leaves the join to others
+    const bool alreadyJoined = !self && std::exchange(joined_, true);
     lock.release();
 
-    const int code = alreadyJoined ? EINVAL : pthread_join(thread, nullptr);
+    const int code = self ? EDEADLK : alreadyJoined ? EINVAL : pthread_join(thread, nullptr);
     switch (code) {
     case 0:
         return;

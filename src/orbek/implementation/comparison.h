@@ -3,10 +3,26 @@
 #include "orbek/fir.h"
 #include "orbek/implementation/configuration_implementation.h"
 #include "orbek/population.h"
+#include "orbek/score.h"
+
+#include <cmath>
 
 /// What the public classes of comparison hold.
 
 namespace Orbek {
+
+/// A number that a caller has given. Numbers beyond a range have a meaning, what is no number has none: as a
+/// threshold it would be below every score.
+/// @throws FNEBadArg naming the argument
+inline float demandNumber(float value, const char* argument) {
+    if (std::isnan(value)) FN_THROW(FNEBadArg, std::string(argument) + " is not a number");
+    return value;
+}
+
+/// What a caller has given as the threshold of scores. @throws FNEBadArg for what is no number
+inline Cmp::Score thresholdOf(const Score& score) {
+    return Cmp::Score(demandNumber(score, "The threshold"));
+}
 
 /// A configuration whose comparison is used.
 class Comparison {

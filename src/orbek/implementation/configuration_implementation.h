@@ -10,7 +10,7 @@ namespace Orbek {
 /// only.
 class Configuration::Implementation {
 public:
-    explicit Implementation(const FNCountedPtr<AppConfigDB>& db) : db_(db), resources_(db) {}
+    explicit Implementation(const FNCountedPtr<AppConfigDB>& db);
 
     static CountedPtr<Implementation> implementation(const Configuration& configuration) {
         return configuration.implementation_;
@@ -19,10 +19,13 @@ public:
     const Resources& resources() const { return resources_; }
     /// Made at first use.
     Fn::Deployment::Configurator& configurator();
+    AppConfigDB& db() { return *db_; }
+    const std::vector<Fault>& faults() const { return faults_; }
 
 private:
     FNCountedPtr<AppConfigDB> db_;
     Resources resources_;
+    std::vector<Fault> faults_;
     FNMutex configuratorMutex_{FNMutex::recursive};
     FNCountedPtr<Fn::Deployment::Configurator> configurator_;
 };

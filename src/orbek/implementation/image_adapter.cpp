@@ -5,12 +5,24 @@
 namespace Orbek {
 namespace {
 
-/// An image on memory that somebody else keeps.
-template <class T> FNImage<T> wrap(const T* pixels, std::uint32_t w, std::uint32_t h) {
+/// Keeps an application's image as long as its pixels are used.
+class Keeper final : public FNRMemCoreBody::Dtor {
+public:
+    explicit Keeper(const Image& image) : image_(image) {}
+    void del(void*) const override {} // the pixels go with the image
+
+private:
+    Image image_;
+};
+
+/// An image on pixels of `owner`.
+template <class T> FNImage<T> wrap(const T* pixels, const Image& owner) {
+    const std::uint32_t w = owner->width(), h = owner->height();
     if (w == 0 || h == 0) return {};
     if (!pixels) FN_THROW(FNEBadArg, "The image gives no pixels");
     constexpr bool noCopy = false; // whoever writes gets a copy
-    return FNImage<T>(FNRMem<T>(pixels, std::uint64_t{w} * h, FNRMemCoreBody::preserve(), noCopy), w, h);
+    const FNCountedPtr<FNRMemCoreBody::Dtor> keeper(new Keeper(owner));
+    return FNImage<T>(FNRMem<T>(pixels, std::uint64_t{w} * h, keeper, noCopy), w, h);
 }
 
 } // namespace
@@ -21,11 +33,11 @@ ImageAdapter::ImageAdapter(const Image& image)
 }
 
 FNImage<unsigned char> ImageAdapter::wrappedGray() const {
-    return wrap(image_->grayScaleRepresentation(), w(), h());
+    return wrap(image_->grayScaleRepresentation(), image_);
 }
 
 FNImage<Fn::Bgra32> ImageAdapter::wrappedColor() const {
-    return wrap(reinterpret_cast<const Fn::Bgra32*>(image_->colorRepresentation()), w(), h());
+    return wrap(reinterpret_cast<const Fn::Bgra32*>(image_->colorRepresentation()), image_);
 }
 
 template <class T> FNImage<T> ImageAdapter::converted() const {

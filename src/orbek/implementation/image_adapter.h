@@ -6,7 +6,7 @@
 namespace Orbek {
 
 /// An application's image as the engines see it. The pixels in the image's own kind, mono8 or bgra32, are not
-/// copied but read where they lie: what toMono8() and toBgra32() return must not outlive the adapter.
+/// copied but read where they lie: what toMono8() and toBgra32() return keeps the application's image.
 class ImageAdapter final : public AttributedImageRepresentation {
 public:
     /// @throws FNEBadArg for a null handle

@@ -5,6 +5,7 @@
 #include "eye/ojo/eyes_finder.h"
 #include "fn/deployment/composite_values.h"
 #include "fn/message/translator.h"
+#include "kx/life_checker.h"
 #include "orbek/implementation/orbek_properties.h"
 
 namespace Orbek {
@@ -20,6 +21,13 @@ Resources::Resources(const FNCountedPtr<AppConfigDB>& configDb)
 Component Resources::rootComponent() const {
     const FNMutexLock lock(mutex_);
     return rootComponent_;
+}
+
+std::list<Component> Resources::rootComponents() const {
+    std::list<Component> roots{rootComponent()};
+    for (const Property& setting : Kx::Implementation::lifeCheckSettings())
+        roots.emplace_back(configDb_, setting);
+    return roots;
 }
 
 FaceFinder Resources::faceFinder() const {
@@ -42,11 +50,13 @@ Cmp::Strategy* makeStrategy(const Component& module) {
     const Component choice = module.subComponent("AlgorithmVersion");
     const auto version =
         Fn::Deployment::Value<Fn::Deployment::Alternative<ComparisonAlgorithms>>::get(choice);
-    if (version != "B7") FN_THROW(FNEBadArg, "Illegal value for Comparison Algorithm");
+    if (version != "B7")
+        FN_THROW(FNEBadArg, "Illegal value for Comparison Algorithm: " + version +
+                                " is not part of this library, which has: B7");
     const FNCountedPtr<Cmp::B7::CmpAlgorithm> algorithm(
         new Cmp::B7::CmpAlgorithm(choice.subComponent(version)));
     return new Cmp::Strategy(algorithm, algorithm->scoreMapping(), algorithm->ratesMapping(),
-                             static_cast<unsigned int>(std::max(threads, 0)));
+                             static_cast<unsigned int>(std::max(threads, 1))); // 0 is the calling thread, too
 }
 
 } // namespace

@@ -42,6 +42,8 @@ public:
     explicit Resources(const FNCountedPtr<AppConfigDB>& configDb);
 
     Fn::Deployment::Component rootComponent() const;
+    /// That one, and the settings that stand beside the tree.
+    std::list<Fn::Deployment::Component> rootComponents() const;
     FNCountedPtr<AppConfigDB> configDb() const { return configDb_; }
 
     /// The engines. The first request reads the model files, and is slow.

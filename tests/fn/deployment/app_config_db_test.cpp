@@ -179,6 +179,44 @@ TEST_F(ConfigFile, AFailedWriteIsThrownByEveryLaterAccess) {
     EXPECT_EQ(thrownBy([&] { db.remove("a"); }), failure);
 }
 
+TEST_F(ConfigFile, AFailedWriteIsToldAtOnceAndLeavesTheOldFileAlone) {
+    // A folder in the place of the file to move away: the new text is written, but cannot take its place.
+    std::filesystem::create_directories(scratch_.file("sub/blocked.conf.bak/x"));
+    const std::string blocked = scratch_.write("sub/blocked.conf", "a = 1\n");
+    const RecordedDialog dialog;
+    AppFileConfigDB db(blocked.c_str(), false);
+    EXPECT_NO_THROW(db.flush()) << "nothing to write";
+    db.set("a", "2");
+    const std::string failure = thrownBy([&] { db.flush(); });
+    EXPECT_EQ(failure.rfind("FNEIOError: Error removing backup config file [" + blocked + ".bak]:", 0), 0u)
+        << failure;
+    EXPECT_EQ(dialog.messages(),
+              std::vector<std::string>{"error: Changes of the configuration are not stored: " +
+                                       failure.substr(std::string("FNEIOError: ").size())});
+    EXPECT_EQ(thrownBy([&] { db.flush(); }), failure) << "still so";
+    EXPECT_EQ(scratch_.read("sub/blocked.conf"), "a = 1\n");
+    for (const auto& entry : std::filesystem::directory_iterator(scratch_.file("sub")))
+        EXPECT_NE(entry.path().extension(), ".tmp");
+}
+
+TEST_F(ConfigFile, FlushWaitsForAllChanges) {
+    scratch_.write("c.conf", "");
+    AppFileConfigDB db(scratch_.file("c.conf").c_str(), false);
+    for (int i = 0; i < 100; ++i) db.set("a", std::to_string(i));
+    db.flush();
+    EXPECT_EQ(scratch_.read("c.conf"), "a = 99\n");
+}
+
+TEST_F(ConfigFile, TellsItsLinesAsTheyAreMeant) {
+    scratch_.write("c.conf", "# one\r\nb = 1%41\n\na = 2\nb = 3\n");
+    const AppFileConfigDB db(scratch_.file("c.conf").c_str(), false);
+    std::string lines;
+    for (const auto& [number, key, value] : db.lines())
+        lines += std::to_string(number) + " " + key + " " + value + ";";
+    EXPECT_EQ(lines, "2 b 1A;3 a 2;4 b 3;");
+    EXPECT_EQ(db.get("b"), "1A");
+}
+
 TEST_F(ConfigFile, LogsAccessWhenItSaysSo) {
     const RecordedDialog dialog;
     change("FNAppConfigLogAccess = yes\na = 1\n", [](AppConfigDB& db) {

@@ -69,6 +69,41 @@ TEST(Thread, RunsWhenStartReturnsAndIsStartedOnce) {
     EXPECT_NO_THROW(thread.join()) << "the second join of an ended thread reports nothing";
 }
 
+TEST(Thread, CanBeJoinedAfterAJoinThatWasRefused) {
+    const std::string refused =
+        "FNEBadArg: FNThread::join: A deadlock was detected or the value of target thread specifies the "
+        "calling thread";
+    for (const bool joinedMeanwhile : {false, true}) {
+        const FNEvent go, tried;
+        std::unique_ptr<FNThread> own;
+        std::string message;
+        const FNThread thread = FNSpawn(
+            [&] {
+                go.wait();
+                message = thrownBy([&] { own->join(); });
+                tried.signal();
+                go.wait();
+            },
+            "own");
+        own = std::make_unique<FNThread>(thread);
+        thread.start();
+        std::thread other;
+        if (joinedMeanwhile) {
+            other = std::thread([&] { EXPECT_EQ(thrownBy([&] { thread.join(); }), "nothing thrown"); });
+            std::this_thread::sleep_for(std::chrono::milliseconds(20));
+        }
+        go.signal();
+        tried.wait();
+        EXPECT_EQ(message, refused);
+        go.signal();
+        if (joinedMeanwhile)
+            other.join();
+        else
+            EXPECT_EQ(thrownBy([&] { thread.join(); }), "nothing thrown");
+        EXPECT_EQ(thread.state().state, FNThreadState::ended) << "the join has waited for the end";
+    }
+}
+
 TEST(Thread, ObserversSeeEachChange) {
     std::vector<int> states;
     const FNThread thread = FNSpawn([] {}, "seen");
@@ -323,6 +358,72 @@ TEST(AsyncBuffer, EndsWhenIdleAndStartsAgain) {
     buffer.push_back([&] { ++ran; }, {});
     ASSERT_TRUE(eventually([&] { return ran == 2; }));
     EXPECT_EQ(busy, 2);
+}
+
+/// What jobs may do wrong, and what is reported of it.
+const struct {
+    Fn::Functor0 job;
+    Fn::Functor1<std::exception> error;
+    std::string reported;
+} wrongJobs[] = {
+    {[] { throw 7; }, {}, "a job threw what is no std::exception"},
+    {[] { FN_THROW(FNEGeneric, "job"); }, [](const std::exception&) { FN_THROW(FNEGeneric, "error"); },
+     "the error functor of a job failed: error"},
+    {[] { FNThreadSelf::exit(); }, {}, ""},
+};
+
+TEST(AsyncBuffer, RunsTheJobsBehindOneThatGoesWrong) {
+    for (const auto& wrong : wrongJobs) {
+        const RecordedDialog dialog;
+        std::atomic<int> ran = 0;
+        {
+            Fn::AsyncBuffer buffer(0);
+            const FNEvent go;
+            buffer.push_back([go] { go.wait(); }, {});
+            buffer.push_back(wrong.job, wrong.error);
+            buffer.push_back([&] { ++ran; }, {}); // waits behind it already
+            go.signal();
+            EXPECT_TRUE(eventually([&] { return ran == 1; })) << wrong.reported;
+            buffer.push_back([&] { ++ran; }, {});
+            EXPECT_TRUE(eventually([&] { return ran == 2; })) << wrong.reported;
+        }
+        std::vector<std::string> expected;
+        if (!wrong.reported.empty()) expected.push_back("error: AsyncBuffer: " + wrong.reported);
+        EXPECT_EQ(dialog.messages(), expected);
+    }
+}
+
+TEST(AsyncBuffer, StartsAgainAfterAnObserverHasEndedItsThread) {
+    Fn::AsyncBuffer buffer(0);
+    std::atomic<int> ran = 0, told = 0;
+    const std::string id = buffer.addObserver([&](const bool&) {
+        ++told;
+        throw 7;
+    });
+    buffer.push_back([&] { ++ran; }, {});
+    ASSERT_TRUE(eventually([&] { return told == 1; }));
+    buffer.removeObserver(id);
+    ASSERT_TRUE(eventually([&] {
+        buffer.push_back([&] { ++ran; }, {});
+        return ran > 1;
+    }));
+}
+
+TEST(AsyncRepeater, RepeatsAJobThatGoesWrong) {
+    for (const auto& wrong : wrongJobs) {
+        const RecordedDialog dialog;
+        std::atomic<int> runs = 0;
+        Fn::AsyncRepeater repeater(
+            [&] {
+                ++runs;
+                wrong.job();
+            },
+            60000, wrong.error);
+        for (int i = 1; i <= 3; ++i) {
+            repeater.trigger();
+            ASSERT_TRUE(eventually([&] { return runs == i; })) << wrong.reported;
+        }
+    }
 }
 
 TEST(AsyncRepeater, RepeatsUntilStopped) {

@@ -58,6 +58,16 @@ TEST_F(RecognitionToolWithModels, VerifiesByItsExitStatus) {
     EXPECT_EQ(run({"verify", bob, "/no/such.jpg"}).status, 2);
     EXPECT_EQ(run({"verify", bob}).status, 2);
     EXPECT_EQ(run({"verify", bob, image("bob1.jpg"), "--far", "0.1", "--score", "0.5"}).status, 2);
+    for (const std::string command : {"verify", "identify"})
+        for (const std::string option : {"--far", "--score"})
+            for (const std::string value : {"nan", "-nan", "-0.1", "1.01", "inf", "x"}) {
+                if (command == "identify" && option == "--score") continue;
+                const ProgramRun no = run({command, bob, image("alice1.jpg"), option, value});
+                EXPECT_EQ(no.status, 2) << command << " " << option << " " << value;
+                EXPECT_NE(no.complaints.find(option + ": \"" + value + "\" is not a number from 0 to 1"),
+                          std::string::npos)
+                    << no.complaints;
+            }
     EXPECT_EQ(run({"verify", "--help"}).status, 0);
 }
 

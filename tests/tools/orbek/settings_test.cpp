@@ -37,12 +37,69 @@ TEST(OrbekSettingsWithModels, AreToldAndChanged) {
                     std::string("orbek: ORBEK.FaceTracke: is no key")},
           {{"list", "ORBEK.FaceTracke"}, "orbek: ORBEK.FaceTracke: is no key"},
           {{"set", "ORBEK.FaceTracker", "1"}, "orbek: ORBEK.FaceTracker: is a group"},
+          {{"set", key, "nan"}, "orbek: " + key + ": \"nan\" is not of the type Float"},
+          {{"set", "ORBEK.ComparisonAlgorithm.AlgorithmVersion", "B8"},
+           "orbek: ORBEK.ComparisonAlgorithm.AlgorithmVersion: \"B8\" is none of B7, B6, A14, B6L5"},
+          {{"set", "ORBEK.Substitutions", "A A"}, "orbek: ORBEK.Substitutions: names \"A\" twice"},
           {{"set", key, "fast"}, "orbek: " + key + ": \"fast\" is not of the type Float"}}) {
         const ProgramRun refused = run(arguments);
         EXPECT_EQ(refused.status, 1) << complaint;
         EXPECT_EQ(refused.complaints.rfind(complaint, 0), 0u) << refused.complaints;
     }
     EXPECT_EQ(run({"get", key}).output, "12.5\n");
+}
+
+TEST(OrbekSettings, FaultyLinesAreErrors) {
+    const ScratchFolder scratch;
+    const std::string first = "ORBEK.Substitutions.INSTALLDIR = /opt\n",
+                      good = scratch.write("good.conf", first),
+                      bad = scratch.write("bad.conf", first + "ORBEK.StreamVerifier.UseLifecheck = true\n" +
+                                                          "ORBEK.FaceTracker.FrameRate = fast\n" + first),
+                      text = scratch.write("text.conf", "nothing\n");
+    const std::string key = "ORBEK.StreamVerifier.UseLifecheck",
+                      reason =
+                          "is no key of the configuration; did you mean ORBEK.StreamVerifier.UseLifeCheck?";
+    for (const auto& arguments :
+         {std::vector<std::string>{"config", "check", bad}, {"config", "check", "--config", bad}}) {
+        const ProgramRun checked = runOrbekJson(arguments);
+        EXPECT_EQ(checked.status, 1);
+        EXPECT_EQ(checked.complaints, "");
+        ASSERT_EQ(checked.lines().size(), 3u);
+        EXPECT_EQ(checked.lines()[0],
+                  nlohmann::json({{"file", bad}, {"line", 2}, {"key", key}, {"reason", reason}}));
+        EXPECT_EQ(checked.lines()[1]["line"], 3);
+        EXPECT_EQ(checked.lines()[2]["line"], 4);
+    }
+    EXPECT_EQ(runOrbek({"config", "check", bad}).output.substr(0, bad.size() + 9), bad + ": line 2:");
+    const ProgramRun fine = runOrbek({"config", "check", good});
+    EXPECT_EQ(fine.status, 0);
+    EXPECT_EQ(fine.output + fine.complaints, "");
+    EXPECT_EQ(runOrbek({"config", "check", text}).status, 1);
+    EXPECT_EQ(runOrbek({"config", "check", scratch.file("none.conf")}).status, 1);
+
+    for (const auto& arguments :
+         {std::vector<std::string>{"config", "list"}, {"find", "x.jpg"}, {"models", "list"}}) {
+        std::vector<std::string> all = arguments;
+        all.insert(all.end(), {"--config", bad});
+        const ProgramRun refused = runOrbek(all);
+        EXPECT_NE(refused.status, 0);
+        EXPECT_EQ(refused.complaints, "orbek: " + bad + ": line 2: " + key + ": " + reason +
+                                          "; 'orbek config check' tells 2 more\n")
+            << arguments[0];
+    }
+
+    // What is wrong with a key does not keep it from being set.
+    const std::string one = scratch.write("one.conf", "ORBEK.FaceTracker.FrameRate = fast\n");
+    EXPECT_EQ(runOrbek({"config", "set", "ORBEK.FaceTracker.FrameRate", "5", "--config", one}).status, 0);
+    EXPECT_EQ(scratch.read("one.conf"), "ORBEK.FaceTracker.FrameRate = 5\n");
+    std::filesystem::create_directories(good + ".bak/x");
+    const ProgramRun blocked =
+        runOrbek({"config", "set", "ORBEK.FaceTracker.FrameRate", "5", "--config", good});
+    EXPECT_EQ(blocked.status, 1);
+    EXPECT_NE(blocked.complaints.find("orbek: Error removing backup config file [" + good + ".bak]"),
+              std::string::npos)
+        << blocked.complaints;
+    EXPECT_EQ(scratch.read("good.conf"), first);
 }
 
 TEST(OrbekModelsWithModels, AreComparedWithTheirSums) {
