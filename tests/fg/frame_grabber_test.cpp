@@ -105,6 +105,20 @@ TEST(MultiFile, DeliversNoFasterThanItsRate) {
     EXPECT_GE(std::chrono::steady_clock::now() - start, std::chrono::milliseconds(55));
 }
 
+TEST(MultiFile, SettingsHaveTheirDefaults) {
+    const Component settings = componentOf<FG::MultiFileDef>("");
+    for (const auto& [key, value] : {std::pair{"FileLocation", "Directory"},
+                                     {"ImageCaching", "true"},
+                                     {"Sorting", "No"},
+                                     {"ContinuousPlayback", "true"},
+                                     {"CaptureFrameRate", "25"},
+                                     {"DeliveryFrameRate", "None"},
+                                     {"ExposureTime", "None"}})
+        EXPECT_EQ(settings.subComponent(key).read(true), value) << key;
+    EXPECT_EQ(settings.subComponent("DeliveryFrameRate").subComponent("Float").read(true), "25");
+    EXPECT_EQ(settings.subComponent("ExposureTime").subComponent("UInt").read(true), "8000");
+}
+
 TEST(MultiFile, LooksAgainAfterATenthOfThePeriodInWholeMilliseconds) {
     for (const auto& [rate, step] :
          {std::pair{1.0f, 100u}, {25.0f, 4u}, {99.0f, 1u}, {101.0f, 0u}, {1e5f, 0u}})
