@@ -154,6 +154,14 @@ TEST(HostileFiles, AGzipFileCostsTheMemoryOfItsPicture) {
     getrusage(RUSAGE_SELF, &after);
     EXPECT_LT(after.ru_maxrss - before.ru_maxrss, 32 * 1024) << "KB";
 
+    // One that is held as a whole is held in proportion to the file.
+    workshop.write("a.tif", "II*");
+    workshop.run("{ cat a.tif; head -c 200000000 /dev/zero; } | gzip -9 > tiff.gz");
+    EXPECT_EQ(thrownBy([&] { Fn::readImage(workshop.path("tiff.gz")); }),
+              "FNEBadFormat: gunzip: " + workshop.path("tiff.gz") + " exceeds the limit of " +
+                  std::to_string((1u << 26) + 64 * std::filesystem::file_size(workshop.path("tiff.gz"))) +
+                  " bytes for decoding");
+
     // What is wrong with the gzip file tells more than what a reader makes of it.
     const std::string whole = bytesOfFile(fixture("gzip/gray1.png.gz"));
     workshop.write("cut.gz", whole.substr(0, whole.size() - 40));
