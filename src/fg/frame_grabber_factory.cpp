@@ -21,13 +21,15 @@ GrabberPair makeMultiFile(const Component& settings, const std::string& name) {
 
 GrabberPair FrameGrabberFactory<FrameGrabberFullSet>::create2(const Component& device,
                                                               const std::string& name,
-                                                              const DllFrameGrabberFactoryCache&) {
+                                                              const DllFrameGrabberFactoryCache&,
+                                                              std::string* reason) {
     const std::string kind = device.read(true);
     if (!std::ranges::any_of(frameGrabberKinds, [&](const FrameGrabberKind& k) { return k.name == kind; }))
         FN_THROW(FNEBadArg, "could not create framegrabber for property " + kind);
     try {
         if (kind == "ImageFiles") return makeMultiFile(device.subComponent(kind), name);
     } catch (const std::exception& e) {
+        if (reason) *reason = e.what();
         FNDialog::error("Could not initialize video capture device " + name + ": " + e.what());
     }
     return {};

@@ -14,9 +14,10 @@ public:
     /// does a kind whose driver is not part of this library.
     /// @param device of type FrameGrabberFactoryDef
     /// @param plugins for kinds that live in shared libraries
+    /// @param reason if not null, tells afterwards why the device could not be made
     /// @throws FNEBadArg for a kind that is none
     static GrabberPair create2(const Fn::Deployment::Component& device, const std::string& name,
-                               const DllFrameGrabberFactoryCache& plugins);
+                               const DllFrameGrabberFactoryCache& plugins, std::string* reason = nullptr);
 };
 
 } // namespace FG

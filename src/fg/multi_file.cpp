@@ -23,7 +23,7 @@ namespace {
 
 constexpr float leastRate = std::numeric_limits<float>::epsilon(); // frames per second
 
-/// A directory's files, in the order in which the system lists them.
+/// A directory's files, in the order in which the system lists them; pipes and devices are none.
 std::vector<std::string> filesIn(const std::string& directory) {
     std::error_code error;
     std::filesystem::directory_iterator entry(directory, error);
@@ -32,8 +32,7 @@ std::vector<std::string> filesIn(const std::string& directory) {
     std::vector<std::string> files;
     for (const std::filesystem::directory_iterator end; entry != end; entry.increment(error)) {
         const std::string path = directory + "/" + entry->path().filename().string();
-        const std::filesystem::file_status status = std::filesystem::status(path, error);
-        if (std::filesystem::exists(status) && !std::filesystem::is_directory(status)) files.push_back(path);
+        if (std::filesystem::is_regular_file(path, error)) files.push_back(path);
     }
     return files;
 }
@@ -84,6 +83,11 @@ Fn::Optional<unsigned int> exposureTime(const Component& component) {
 
 } // namespace
 
+unsigned long deliveryStep(float period) {
+    constexpr float longest = 1e6f;
+    return static_cast<unsigned long>(std::min(100 * period, longest));
+}
+
 class MultiFile::Implementation {
 public:
     Implementation(const Component& component, const std::string& name)
@@ -92,8 +96,8 @@ public:
           framePeriod_(framePeriod(component)), deliveryPeriod_(deliveryPeriod(component)),
           exposureTime_(exposureTime(component)), files_(listFiles(component)) {
         if (caching_)
-            for (const std::string& file : files_) cache_.push_back(read(file));
-        const FNImageReference first = caching_ ? cache_.front() : read(files_.front());
+            for (const std::string& file : files_) cache_.push_back(readAtStart(file));
+        const FNImageReference first = caching_ ? cache_.front() : readAtStart(files_.front());
         w_ = first.w();
         h_ = first.h();
         nextCapture_ = Fn::TimeStamp::now();
@@ -136,9 +140,18 @@ public:
 
 private:
     FNImageReference read(const std::string& file) const {
-        FNImageReference image = Fn::readImage(file);
+        FNImageReference image = Fn::readImage(file, {}, Fn::ImageLimits::withRareVariants());
         if (exposureTime_.isSet()) Fn::addImageExposureTime(image.attributes(), *exposureTime_);
         return image;
+    }
+
+    /// Nobody knows yet which file is meant.
+    FNImageReference readAtStart(const std::string& file) const {
+        try {
+            return read(file);
+        } catch (const std::exception& e) {
+            FN_THROW(FNEBadArg, "MultiFile: file `" + file + "' cannot be read: " + e.what());
+        }
     }
 
     void advance(std::size_t& position) const {
@@ -151,9 +164,7 @@ private:
     void waitUntilNextDeliveryTimeframe() {
         if (deliveryPeriod_ == 0) return;
         const auto due = lastDelivery_ + std::chrono::duration<double>(deliveryPeriod_);
-        // A tenth of the period; rates of more than 100 frames a second wait in steps of a millisecond.
-        const double step = std::clamp(100.0 * deliveryPeriod_, 1.0, 1e6);
-        while (Clock::now() < due) FNThreadSelf::sleep(static_cast<unsigned long>(step));
+        while (Clock::now() < due) FNThreadSelf::sleep(deliveryStep(deliveryPeriod_));
         lastDelivery_ = Clock::now();
     }
 

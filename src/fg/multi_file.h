@@ -14,8 +14,8 @@ class MultiFile final : public Fn::LiveVideoSource {
 public:
     /// Lists the files and, with `ImageCaching`, reads them all.
     /// @param name of the device
-    /// @throws FNEBadArg for a rate that is not positive, or without any file; FNEIOError for a directory
-    /// that cannot be read; what Fn::readImage() throws
+    /// @throws FNEBadArg for a rate that is not positive, without any file, or for a file that is read and is
+    /// no image: all with `ImageCaching`, otherwise the first; FNEIOError for a directory that cannot be read
     MultiFile(const Fn::Deployment::Component& component, const std::string& name);
     MultiFile(const MultiFile&);
     ~MultiFile() override;
@@ -42,6 +42,11 @@ public:
 private:
     FNCountedPtr<Implementation> implementation_;
 };
+
+/// Milliseconds in which a MultiFile looks again whether the next image is due: a tenth of the period in
+/// whole ones, so that there is no pause above 100 images a second.
+/// @param period seconds from one image to the next
+unsigned long deliveryStep(float period);
 
 /// The files of a MultiFile as single pictures.
 class MFileStillImageSource final : public StillImageSource {

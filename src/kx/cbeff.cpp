@@ -6,7 +6,6 @@
 
 #include <array>
 #include <cmath>
-#include <optional>
 #include <vector>
 
 namespace Kx::CBEFF {
@@ -98,16 +97,38 @@ EyePair readFeaturePoints(std::istream& stream, std::uint32_t count) {
     return eyes;
 }
 
-/// @param size bytes that the block's length leaves for the image; none if the length cannot be right
-FNImageReference readImageData(std::istream& stream, std::optional<std::uint32_t> size,
-                               const Fn::ImageLimits& limits) {
-    if (!size) return Fn::readImage(stream, {}, limits);
+/// What the images of a record may have in pixels all together. It grows with the bytes that they are read
+/// from, so that memory stays in proportion to the record however many images it announces.
+class PixelBudget {
+public:
+    explicit PixelBudget(std::uint64_t first) : left_(first) {}
+    /// Many more than a photo has for a byte of its file.
+    void addFile(std::uint64_t bytes) { left_ += 32 * bytes; }
+    std::uint64_t left() const { return left_; }
+    void take(std::uint64_t pixels) { left_ -= pixels; }
+
+private:
+    std::uint64_t left_;
+};
+
+/// @param size bytes that the block's length leaves for the image; 0 if the length cannot be right
+FNImageReference readImageData(std::istream& stream, std::uint32_t size, Fn::ImageLimits limits,
+                               PixelBudget& budget) {
+    const auto read = [&](std::istream& file) {
+        limits.maxPixels = std::min(limits.maxPixels, budget.left());
+        const FNImageReference image = Fn::readImage(file, {}, limits);
+        budget.take(std::uint64_t{image.w()} * image.h());
+        return image;
+    };
+    if (size == 0) return read(stream);
     // A reader of one image may look beyond its end, where the next block begins.
-    Fn::MemoryStream file(Fn::readUpTo(stream, *size, "Kx::CBEFF::read"));
-    return Fn::readImage(file, {}, limits);
+    const FNRMem<unsigned char> bytes = Fn::readUpTo(stream, size, "Kx::CBEFF::read");
+    budget.addFile(bytes.size());
+    Fn::MemoryStream file(bytes);
+    return read(file);
 }
 
-Cmp::Face readFace(std::istream& stream, const Fn::ImageLimits& limits) {
+Cmp::Face readFace(std::istream& stream, const Fn::ImageLimits& limits, PixelBudget& budget) {
     const StoredFields<facialInformationSize> information(stream, "CBEFF FacialInformation");
     const std::uint32_t blockLength = information.uint32(0), points = information.uint16(4);
     EyePair eyes = readFeaturePoints(stream, points);
@@ -121,9 +142,7 @@ Cmp::Face readFace(std::istream& stream, const Fn::ImageLimits& limits) {
     const std::uint32_t headers = static_cast<std::uint32_t>(facialInformationSize + imageInformationSize) +
                                   static_cast<std::uint32_t>(featurePointSize) * points;
     const bool credible = blockLength > headers && blockLength - headers <= limits.maxBytes;
-    return Cmp::Face(
-        readImageData(stream, credible ? std::optional(blockLength - headers) : std::nullopt, limits),
-        location);
+    return Cmp::Face(readImageData(stream, credible ? blockLength - headers : 0, limits, budget), location);
 }
 
 } // namespace
@@ -175,12 +194,10 @@ void write(std::ostream& stream, std::list<Cmp::Face> const& faces) {
 std::list<Cmp::Face> read(std::istream& stream, const Fn::ImageLimits& limits) {
     const StoredFields<cbeffHeaderSize> header(stream, "CBEFFHeader");
     const StoredFields<recordHeaderSize> record(stream, "CBEFF FacialRecordHeader");
-    Fn::ImageLimits left = limits;
+    PixelBudget budget(limits.maxPixels);
     std::list<Cmp::Face> faces;
-    for (std::uint32_t count = record.uint16(12); count > 0; --count) {
-        faces.push_back(readFace(stream, left));
-        left.maxPixels -= std::uint64_t{faces.back().image().w()} * faces.back().image().h();
-    }
+    for (std::uint32_t count = record.uint16(12); count > 0; --count)
+        faces.push_back(readFace(stream, limits, budget));
     return faces;
 }
 

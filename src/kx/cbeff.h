@@ -32,7 +32,8 @@ void write(std::ostream& stream, std::list<Cmp::Face> const& faces);
 
 /// Reads a record of any type of face images. Each face has a location, but no eyes of an eye finder: the
 /// location follows from the format for token images, and from the points of the eye centres otherwise.
-/// @param limits for each image; the number of pixels for all of the record together
+/// @param limits for each image. All images of a record together may have as many pixels as one, and 32 more
+/// for each byte of their files
 /// @throws FNEOutOfRange for a record that ends early; FNEBadArg for a type of images that is not known; and
 /// std::invalid_argument if the eyes coincide, as they do where a record has no points of them; what
 /// Fn::readImage() throws.

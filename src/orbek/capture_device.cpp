@@ -14,10 +14,11 @@ using Fn::Deployment::Component;
 namespace {
 
 /// Kinds that are not part of the library may live in a plug-in.
+/// @param reason tells afterwards why there is no source, if that is known
 FG::GrabberPair makeGrabber(const Component& device, const std::string& name,
-                            FG::DllFrameGrabberFactoryCache& plugins) {
+                            FG::DllFrameGrabberFactoryCache& plugins, std::string& reason) {
     const FG::GrabberPair made =
-        FG::FrameGrabberFactory<FG::FrameGrabberFullSet>::create2(device, name, plugins);
+        FG::FrameGrabberFactory<FG::FrameGrabberFullSet>::create2(device, name, plugins, &reason);
     const std::string kind = device.read(true), library = plugins.path(kind);
     if (made.first || made.second || library.empty()) return made;
     if (const Fn::Dll dll(library); isPluginCamera(dll)) return openPluginCamera(dll, name);
@@ -62,9 +63,10 @@ CaptureDevice createCaptureDevice(const Configuration& configuration, const std:
     const Component root = implementation->resources().rootComponent();
     const Component device = root.subComponent("CaptureDevices").subComponent(name);
     const auto plugins = implementation->resources().dllFrameGrabberFactoryCache();
-    const FG::GrabberPair grabber = makeGrabber(device, name, *plugins);
+    std::string reason;
+    const FG::GrabberPair grabber = makeGrabber(device, name, *plugins, reason);
     const bool controlled = listsElement(root.subComponent("CameraControllers"), name);
-    return CaptureDevice(new CaptureDeviceImpl(device.name(), grabber, controlled));
+    return CaptureDevice(new CaptureDeviceImpl(device.name(), grabber, reason, controlled));
 }
 
 } // namespace Orbek

@@ -10,6 +10,15 @@
 
 namespace Orbek {
 
+namespace {
+
+/// What people have in their files is read in all its variants.
+Fn::ImageLimits variants() {
+    return Fn::ImageLimits::withRareVariants();
+}
+
+} // namespace
+
 namespace ImageIO {
 
 PropertiesFeedbackBody::PropertiesFeedbackBody() = default;
@@ -23,12 +32,32 @@ PropertiesFeedback noFeedback() {
     return PropertiesFeedback(new DummyPropertiesFeedback);
 }
 
+Limits limits() {
+    const Fn::ImageLimits present;
+    return {present.maxWidth, present.maxHeight, present.maxPixels, present.maxBytes};
+}
+
+void setLimits(const Limits& limits) {
+    constexpr std::uint32_t mostRows = 0x7FFFFFFF;
+    for (const std::uint32_t side : {limits.maxWidth, limits.maxHeight})
+        if (side == 0 || side > mostRows)
+            FN_THROW(FNEBadArg, "ImageIO::setLimits: maxWidth and maxHeight must be 1 to 2147483647");
+    if (limits.maxPixels == 0 || limits.maxBytes == 0)
+        FN_THROW(FNEBadArg, "ImageIO::setLimits: maxPixels and maxBytes must be above 0");
+    Fn::ImageLimits changed;
+    changed.maxWidth = limits.maxWidth;
+    changed.maxHeight = limits.maxHeight;
+    changed.maxPixels = limits.maxPixels;
+    changed.maxBytes = limits.maxBytes;
+    Fn::ImageLimits::setDefaults(changed);
+}
+
 Image load(const std::string& fileName, const PropertiesFeedback& feedback) {
-    return adapt(Fn::readImage(fileName, adapt(feedback)), fileName);
+    return adapt(Fn::readImage(fileName, adapt(feedback), variants()), fileName);
 }
 
 Image load(std::istream& stream, const PropertiesFeedback& feedback) {
-    return adapt(Fn::readImage(stream, adapt(feedback)), "fromStream");
+    return adapt(Fn::readImage(stream, adapt(feedback), variants()), "fromStream");
 }
 
 } // namespace ImageIO
@@ -36,11 +65,11 @@ Image load(std::istream& stream, const PropertiesFeedback& feedback) {
 namespace Bmp {
 
 Image load(const std::string& fileName, const PropertiesFeedback& feedback) {
-    return adapt(Fn::loadBMP(fileName, adapt(feedback)), fileName);
+    return adapt(Fn::loadBMP(fileName, adapt(feedback), variants()), fileName);
 }
 
 Image load(std::istream& stream, const PropertiesFeedback& feedback) {
-    return adapt(Fn::readBMP(stream, adapt(feedback)), "std::istream");
+    return adapt(Fn::readBMP(stream, adapt(feedback), variants()), "std::istream");
 }
 
 void save(const Image& image, const std::string& fileName) {
@@ -52,15 +81,15 @@ void save(const Image& image, const std::string& fileName) {
 namespace Jpeg {
 
 Image load(const std::string& fileName, const PropertiesFeedback& feedback) {
-    return adapt(Fn::loadJpeg(fileName, adapt(feedback)), fileName);
+    return adapt(Fn::loadJpeg(fileName, adapt(feedback), variants()), fileName);
 }
 
 Image load(std::istream& stream, const PropertiesFeedback& feedback) {
-    return adapt(Fn::readJpeg(stream, adapt(feedback)), "fromStream");
+    return adapt(Fn::readJpeg(stream, adapt(feedback), variants()), "fromStream");
 }
 
 Image load(const char* data, unsigned int size, const PropertiesFeedback& feedback) {
-    return adapt(Fn::readJpeg(data, size, adapt(feedback)), "fromBuffer");
+    return adapt(Fn::readJpeg(data, size, adapt(feedback), variants()), "fromBuffer");
 }
 
 void save(const Image& image, std::ostream& stream, int quality) {
@@ -81,15 +110,15 @@ SizeAndQuality saveWithSizeConstraint(const Image& image, std::ostream& stream, 
 namespace Jpeg2000 {
 
 Image load(const std::string& fileName, const PropertiesFeedback& feedback) {
-    return adapt(Fn::loadJ2k(fileName, adapt(feedback)), fileName);
+    return adapt(Fn::loadJ2k(fileName, adapt(feedback), variants()), fileName);
 }
 
 Image load(std::istream& stream, const PropertiesFeedback& feedback) {
-    return adapt(Fn::readJ2k(stream, adapt(feedback)), "Stream");
+    return adapt(Fn::readJ2k(stream, adapt(feedback), variants()), "Stream");
 }
 
 Image load(const char* data, unsigned int size, const PropertiesFeedback& feedback) {
-    return adapt(Fn::loadJ2k(data, size, adapt(feedback)), "Buffer");
+    return adapt(Fn::loadJ2k(data, size, adapt(feedback), variants()), "Buffer");
 }
 
 } // namespace Jpeg2000
@@ -97,7 +126,7 @@ Image load(const char* data, unsigned int size, const PropertiesFeedback& feedba
 namespace Pgm {
 
 Image load(const std::string& fileName, const PropertiesFeedback& feedback) {
-    return adapt(Fn::readImage(fileName, adapt(feedback)), fileName);
+    return adapt(Fn::readImage(fileName, adapt(feedback), variants()), fileName);
 }
 
 void save(const Image& image, const std::string& fileName) {
@@ -109,11 +138,11 @@ void save(const Image& image, const std::string& fileName) {
 namespace Png {
 
 Image load(const std::string& fileName, const PropertiesFeedback& feedback) {
-    return adapt(Fn::readPng(fileName, adapt(feedback)), fileName);
+    return adapt(Fn::readPng(fileName, adapt(feedback), variants()), fileName);
 }
 
 Image load(std::istream& stream, const PropertiesFeedback& feedback) {
-    return adapt(Fn::readPng(stream, adapt(feedback)), "");
+    return adapt(Fn::readPng(stream, adapt(feedback), variants()), "");
 }
 
 void save(const Image& image, std::ostream& stream, int level) {

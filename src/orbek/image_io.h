@@ -11,12 +11,15 @@
 ///     const Orbek::Image image = Orbek::ImageIO::load("portrait.jpg");
 ///     Orbek::Jpeg::save(image, "copy.jpg", 90);
 ///
-/// Readers take files up to 65535 columns, 65535 rows and 2^27 pixels. All failures are exceptions derived
-/// from std::exception whose text names what is wrong.
+/// Readers take files up to 65535 columns, 65535 rows and 2^27 pixels, unless ImageIO::setLimits() says
+/// otherwise. A file that is saved appears whole or not at all: after a failure, what was there before is
+/// there still. All failures are exceptions derived from std::exception whose text names what is wrong.
 
 namespace Orbek {
 
-namespace [[gnu::visibility("default")]] ImageIO {
+#pragma GCC visibility push(default)
+
+namespace ImageIO {
 
 /// How the pixels of a file are coded.
 enum class ColorMode {
@@ -77,26 +80,44 @@ public:
 /// A DummyPropertiesFeedback.
 PropertiesFeedback noFeedback();
 
-/// Reads JPEG, PNG, JPEG 2000, TIFF, PGM, PPM and BMP, told apart by their first bytes; the file form also
-/// looks into a gzip file.
+/// What a file may make its reader do. A file that announces more is refused before memory is taken for it.
+struct Limits {
+    /// Columns, rows and pixels of an image. Formats have limits of their own, such as 65500 columns and rows
+    /// in JPEG.
+    std::uint32_t maxWidth = 65535;
+    std::uint32_t maxHeight = 65535;
+    std::uint64_t maxPixels = 1u << 27;
+    /// Memory for an image while it is decoded. A colour image takes 4 bytes for each pixel, or 6 with 16
+    /// bits for each sample; JPEG 2000 takes 24, and TIFF and JPEG 2000 hold the file beside it.
+    std::uint64_t maxBytes = 1u << 30;
+};
+/// The limits of the process.
+Limits limits();
+/// Sets the limits for all that the process reads from now on. May be called while other threads read: these
+/// go on with the limits that they began with.
+/// @throws std::exception for a limit of 0, or more than 2^31 - 1 columns or rows
+void setLimits(const Limits& limits);
+
+/// Reads JPEG, PNG, JPEG 2000, TIFF, PBM, PGM, PPM and BMP, told apart by their first bytes; the file form
+/// also looks into a gzip file.
 Image load(const std::string& fileName, const PropertiesFeedback& feedback = noFeedback());
 Image load(std::istream& stream, const PropertiesFeedback& feedback = noFeedback());
 
-} // namespace gnu::visibility("default")]]ImageIO
+} // namespace ImageIO
 
 using ImageIO::noFeedback;
 using ImageIO::PropertiesFeedback;
 
-namespace [[gnu::visibility("default")]] Bmp {
+namespace Bmp {
 
 Image load(const std::string& fileName, const PropertiesFeedback& feedback = noFeedback());
 Image load(std::istream& stream, const PropertiesFeedback& feedback = noFeedback());
 /// 24 bits a pixel for colour, 8 for gray.
 void save(const Image& image, const std::string& fileName);
 
-} // namespace gnu::visibility("default")]]Bmp
+} // namespace Bmp
 
-namespace [[gnu::visibility("default")]] Jpeg {
+namespace Jpeg {
 
 Image load(const std::string& fileName, const PropertiesFeedback& feedback = noFeedback());
 Image load(std::istream& stream, const PropertiesFeedback& feedback = noFeedback());
@@ -113,25 +134,25 @@ struct SizeAndQuality {
 /// @throws std::exception if there is none; the stream is untouched then
 SizeAndQuality saveWithSizeConstraint(const Image& image, std::ostream& stream, int maxBytes);
 
-} // namespace gnu::visibility("default")]]Jpeg
+} // namespace Jpeg
 
-namespace [[gnu::visibility("default")]] Jpeg2000 {
+namespace Jpeg2000 {
 
 Image load(const std::string& fileName, const PropertiesFeedback& feedback = noFeedback());
 Image load(std::istream& stream, const PropertiesFeedback& feedback = noFeedback());
 Image load(const char* data, unsigned int size, const PropertiesFeedback& feedback = noFeedback());
 
-} // namespace gnu::visibility("default")]]Jpeg2000
+} // namespace Jpeg2000
 
-namespace [[gnu::visibility("default")]] Pgm {
+namespace Pgm {
 
 Image load(const std::string& fileName, const PropertiesFeedback& feedback = noFeedback());
 /// A PPM file for colour, a PGM file for gray, of 8 bits.
 void save(const Image& image, const std::string& fileName);
 
-} // namespace gnu::visibility("default")]]Pgm
+} // namespace Pgm
 
-namespace [[gnu::visibility("default")]] Png {
+namespace Png {
 
 Image load(const std::string& fileName, const PropertiesFeedback& feedback = noFeedback());
 Image load(std::istream& stream, const PropertiesFeedback& feedback = noFeedback());
@@ -139,6 +160,8 @@ Image load(std::istream& stream, const PropertiesFeedback& feedback = noFeedback
 void save(const Image& image, std::ostream& stream, int level);
 void save(const Image& image, const std::string& fileName, int level = -1);
 
-} // namespace gnu::visibility("default")]]Png
+} // namespace Png
+
+#pragma GCC visibility pop
 
 } // namespace Orbek

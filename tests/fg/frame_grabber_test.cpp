@@ -14,6 +14,7 @@
 #include <sstream>
 
 #include <dlfcn.h>
+#include <sys/stat.h>
 
 namespace {
 
@@ -102,6 +103,40 @@ TEST(MultiFile, DeliversNoFasterThanItsRate) {
     widths(grabber, 4);
     // The first period begins when the grabber is made, a moment before.
     EXPECT_GE(std::chrono::steady_clock::now() - start, std::chrono::milliseconds(55));
+}
+
+TEST(MultiFile, SettingsHaveTheirDefaults) {
+    const Component settings = componentOf<FG::MultiFileDef>("");
+    for (const auto& [key, value] : {std::pair{"FileLocation", "Directory"},
+                                     {"ImageCaching", "true"},
+                                     {"Sorting", "No"},
+                                     {"ContinuousPlayback", "true"},
+                                     {"CaptureFrameRate", "25"},
+                                     {"DeliveryFrameRate", "None"},
+                                     {"ExposureTime", "None"}})
+        EXPECT_EQ(settings.subComponent(key).read(true), value) << key;
+    EXPECT_EQ(settings.subComponent("DeliveryFrameRate").subComponent("Float").read(true), "25");
+    EXPECT_EQ(settings.subComponent("ExposureTime").subComponent("UInt").read(true), "8000");
+}
+
+TEST(MultiFile, LooksAgainAfterATenthOfThePeriodInWholeMilliseconds) {
+    for (const auto& [rate, step] :
+         {std::pair{1.0f, 100u}, {25.0f, 4u}, {99.0f, 1u}, {101.0f, 0u}, {1e5f, 0u}})
+        EXPECT_EQ(FG::deliveryStep(1 / rate), step) << rate;
+    EXPECT_EQ(FG::deliveryStep(1e30f), 1000000u);
+}
+
+TEST(MultiFile, ListsOnlyFilesAndTellsWhichIsNoImage) {
+    const ThreeFiles files;
+    ASSERT_EQ(mkfifo(files.file("pipe").c_str(), 0600), 0); // would never end
+    FG::MultiFile grabber = multiFile(files.folder() + "X.Sorting = AscendingByName\n");
+    EXPECT_EQ(widths(grabber, 4), (Images{1, 2, 3, 1}));
+    const std::string readme = files.write("README", "of a camera");
+    EXPECT_EQ(thrownBy([&] { multiFile(files.folder()); }),
+              "FNEBadArg: MultiFile: file `" + readme +
+                  "' cannot be read: Fn::readImage: Not a known image "
+                  "format in " +
+                  readme);
 }
 
 TEST(MultiFile, RefusesSettingsWithoutSense) {

@@ -230,15 +230,25 @@ TEST(CBEFF, ARecordThatEndsTooEarlyNamesWhatIsMissing) {
     EXPECT_NE(thrownBy([&] { readBack(bytes.substr(0, bytes.size() - 30)); }), "nothing thrown");
 }
 
-TEST(CBEFF, PixelsOfAllImagesCountTogether) {
-    const std::string block = Record::block(3, {}, 24, pngFile()); // 200 pixels
+TEST(CBEFF, TheLimitOfPixelsIsForOneImage) {
+    const std::string record = written(std::list<Cmp::Face>(12, faceOf(pattern(64, 48, true))));
     Fn::ImageLimits limits;
-    limits.maxPixels = 500;
-    EXPECT_EQ(readBack(Record::of({block, block}), limits).size(), 2u);
-    EXPECT_EQ(thrownBy([&] {
-                  readBack(Record::of({block, block, block}), limits);
-              }).substr(0, 12),
-              "FNEBadFormat");
+    limits.maxPixels = 64 * 48;
+    EXPECT_EQ(readBack(record, limits).size(), 12u);
+    --limits.maxPixels;
+    EXPECT_THROW(readBack(record, limits), FNEBadFormat);
+}
+
+TEST(CBEFF, ManyLargeImagesOfFewBytesAreRefused) {
+    std::ostringstream file;
+    FNImage<unsigned char> blank(400, 300);
+    blank.fill(255);
+    Fn::writePng(blank, file, 9);
+    const std::string block = Record::block(3, {}, 24, file.str());
+    Fn::ImageLimits limits;
+    limits.maxPixels = blank.size();
+    EXPECT_EQ(readBack(Record::of({block}), limits).size(), 1u);
+    EXPECT_EQ(thrownBy([&] { readBack(Record::of({block, block}), limits); }).substr(0, 12), "FNEBadFormat");
 }
 
 TEST(CBEFF, AStreamThatTakesNothingIsAnError) {

@@ -1,7 +1,6 @@
 #pragma once
 
 #include <iosfwd>
-#include <span>
 
 namespace Orbek::Tool {
 
@@ -17,11 +16,9 @@ enum class Orientation {
     TurnCounterClockwise = 8,
 };
 
-/// Of a TIFF structure as it lies in an Exif block; Upright for a damaged one or one that does not tell.
-Orientation orientationInTiff(std::span<const unsigned char> tiff);
-
-/// Of a file that begins at the stream's position; Upright if it is no JPEG file with an Exif block. Moves
-/// the stream.
-Orientation orientationInJpeg(std::istream& stream);
+/// Of a file that begins at the stream's position: in the first directory of a TIFF file (BigTIFF too), or in
+/// the Exif block of a JPEG or PNG file. Upright for any other file, a damaged one, and one that does not
+/// tell. Moves the stream, which must be able to seek for TIFF only.
+Orientation orientationIn(std::istream& stream);
 
 } // namespace Orbek::Tool

@@ -1,5 +1,7 @@
 #include "options.h"
 
+#include "orbek/image_io.h"
+
 #include <algorithm>
 #include <thread>
 
@@ -23,6 +25,35 @@ CLI::Option* add(CLI::App& command, const std::string& name, Share& share, const
 
 } // namespace
 
+namespace {
+
+/// Options that change what the readers of pictures refuse.
+void addLimits(CLI::App& command) {
+    const auto add = [&](const char* name, std::uint64_t greatest, const char* description, auto set) {
+        const auto change = [set](const std::uint64_t& value) {
+            ImageIO::Limits limits = ImageIO::limits();
+            set(limits, value);
+            ImageIO::setLimits(limits);
+        };
+        command.add_option_function<std::uint64_t>(name, change, description)
+            ->type_name("N")
+            ->check(CLI::Range(std::uint64_t{1}, greatest));
+    };
+    add("--max-pixels", std::uint64_t{1} << 40,
+        "Refuse pictures of more pixels, 134217728 otherwise; for more, memory grows with it",
+        [](ImageIO::Limits& limits, std::uint64_t value) {
+            constexpr std::uint64_t mostBytesPerPixel = 24;
+            if (value > limits.maxPixels) limits.maxBytes = mostBytesPerPixel * value;
+            limits.maxPixels = value;
+        });
+    add("--max-side", 0x7FFFFFFF, "Refuse pictures of more columns or rows, 65535 otherwise",
+        [](ImageIO::Limits& limits, std::uint64_t value) {
+            limits.maxWidth = limits.maxHeight = static_cast<std::uint32_t>(value);
+        });
+}
+
+} // namespace
+
 CLI::App* addCommand(CLI::App& parent, const std::string& name, const std::string& description,
                      CommonOptions& options) {
     CLI::App* const command = parent.add_subcommand(name, description);
@@ -30,6 +61,7 @@ CLI::App* addCommand(CLI::App& parent, const std::string& name, const std::strin
         ->type_name("FILE");
     command->add_flag("--json", options.json, "Print results as JSON, one object a line");
     command->add_flag("--quiet", options.quiet, "Show no progress bar");
+    addLimits(*command);
     return command;
 }
 

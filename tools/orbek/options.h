@@ -28,7 +28,7 @@ CLI::App* addGroup(CLI::App& program, const std::string& name, const std::string
 
 /// Adds the pictures that a command works on, see pictureFiles().
 void addImages(CLI::App& command, std::vector<std::string>& images,
-               const std::string& description = "Image files, or folders of them");
+               const std::string& description = "Image files, or folders of them; - for standard input");
 /// Adds how many threads share the work: as many as there are processors, unless told otherwise.
 void addJobs(CLI::App& command, unsigned int& jobs);
 

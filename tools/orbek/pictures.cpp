@@ -1,5 +1,7 @@
 #include "pictures.h"
 
+#include "fn/imagefile/byte_stream.h"
+#include "fn/imagefile/gunzip.h"
 #include "fn/imagefile/image_file.h"
 #include "fn/imagefile/jpeg.h"
 #include "fn/whole_file.h"
@@ -12,6 +14,7 @@
 #include <cctype>
 #include <cstring>
 #include <fstream>
+#include <map>
 #include <set>
 #include <stdexcept>
 
@@ -22,6 +25,9 @@ namespace fs = std::filesystem;
 
 constexpr int drawnQuality = 92;
 
+/// As a name of a file.
+constexpr const char* standardInput = "-";
+
 constexpr std::array imageEndings{".jpg", ".jpeg", ".png", ".bmp", ".pgm", ".ppm",
                                   ".pnm", ".jp2",  ".j2k", ".jpc", ".tif", ".tiff"};
 
@@ -31,7 +37,8 @@ bool isImageName(const fs::path& file) {
     return std::find(imageEndings.begin(), imageEndings.end(), ending) != imageEndings.end();
 }
 
-/// Image files, and folders that are neither hidden nor links, each in order.
+/// Image files and folders, each in order. Hidden ones, links to folders and what is neither (a pipe would
+/// never end) are left out.
 struct FolderContent {
     std::vector<fs::path> pictures, folders;
 };
@@ -42,9 +49,10 @@ FolderContent contentOf(const fs::path& folder) {
     for (fs::directory_iterator entry(folder, failure), end; !failure && entry != end;
          entry.increment(failure)) {
         const fs::path& path = entry->path();
-        if (!entry->is_directory(ignored)) {
+        if (path.filename().native().front() == '.') continue;
+        if (entry->is_regular_file(ignored)) {
             if (isImageName(path)) content.pictures.push_back(path);
-        } else if (!entry->is_symlink(ignored) && path.filename().native().front() != '.')
+        } else if (entry->is_directory(ignored) && !entry->is_symlink(ignored))
             content.folders.push_back(path);
     }
     if (failure) throw std::runtime_error(folder.string() + ": " + failure.message());
@@ -104,6 +112,23 @@ template <class T> FNImageReference turned(const FNImage<T>& image, Orientation 
     return FNImageReferenceFactory::create(result());
 }
 
+/// Whether the file can be read only once, from its start to its end.
+bool isPipe(const fs::path& file) {
+    std::error_code ignored;
+    return file == standardInput || (fs::exists(file, ignored) && fs::is_other(file, ignored));
+}
+
+/// The content of a pipe is kept, since a picture may be read again.
+FNRMem<unsigned char> contentOfPipe(const fs::path& file, const Fn::ImageLimits& limits) {
+    static std::mutex mutex; // guards the contents
+    static std::map<fs::path, FNRMem<unsigned char>> contents;
+    const std::lock_guard lock(mutex);
+    if (const auto known = contents.find(file); known != contents.end()) return known->second;
+    const fs::path path = file == standardInput ? fs::path("/dev/stdin") : file;
+    std::ifstream stream = Fn::openForReading(path.string());
+    return contents[file] = Fn::readRest(stream, limits.maxBytes, file.c_str());
+}
+
 FNImageReference blackPixel() {
     FNImage<unsigned char> image(1, 1);
     image.fill(0);
@@ -139,9 +164,18 @@ FNImageReference upright(const FNImageReference& image, Orientation orientation)
 }
 
 FNImageReference readUpright(const fs::path& file) {
+    const Fn::ImageLimits limits = Fn::ImageLimits::withRareVariants();
+    if (isPipe(file)) {
+        const FNRMem<unsigned char> bytes = contentOfPipe(file, limits);
+        Fn::MemoryStream stream(bytes), again(bytes);
+        const Orientation orientation = orientationIn(stream);
+        return upright(Fn::readImage(again, {}, limits), orientation);
+    }
+    const FNImageReference image = Fn::readImage(file.string(), {}, limits);
     std::ifstream stream(file, std::ios::binary);
-    const Orientation orientation = orientationInJpeg(stream);
-    return upright(Fn::readImage(file.string()), orientation);
+    if (Fn::peekBytes(stream, 2, "readUpright") != "\x1F\x8B") return upright(image, orientationIn(stream));
+    Fn::GunzipStream content(file.string(), limits);
+    return upright(image, orientationIn(content));
 }
 
 Image PictureFile::picture() const {

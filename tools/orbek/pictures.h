@@ -14,7 +14,8 @@
 namespace Orbek::Tool {
 
 /// The arguments, with each folder replaced by the image files in it, in the order of their names (numbers in
-/// names by their value: frame9 comes before frame10). A file that is named is taken whatever it is.
+/// names by their value: frame9 comes before frame10); hidden files are left out. A file that is named is
+/// taken whatever it is.
 /// @throws std::runtime_error for a folder that cannot be read or has no image files
 std::vector<std::filesystem::path> pictureFiles(const std::vector<std::string>& arguments);
 
@@ -28,7 +29,8 @@ struct PictureTree {
     std::vector<std::string> complaints; ///< of what is left out
 };
 
-/// Walks all folders but hidden ones and links to folders. Image files in the root itself are left out.
+/// Walks all folders but hidden ones and links to folders. Image files in the root itself are left out, and
+/// hidden ones.
 /// @throws std::runtime_error if the root cannot be read or nothing is below it
 PictureTree picturesBelow(const std::filesystem::path& root);
 
@@ -36,7 +38,8 @@ PictureTree picturesBelow(const std::filesystem::path& root);
 /// as it is.
 FNImageReference upright(const FNImageReference& image, Orientation orientation);
 
-/// Reads a file of any format that the library knows, and turns it upright.
+/// Reads a file of any format that the library knows, and turns it upright. "-" is the standard input, which
+/// is read once, as pipes are.
 /// @throws std::exception that tells what is wrong
 FNImageReference readUpright(const std::filesystem::path& file);
 

@@ -15,7 +15,7 @@ namespace Fn {
 class GunzipStream::Buffer : public std::streambuf {
 public:
     Buffer(const std::string& fileName, const ImageLimits& limits)
-        : fileName_(fileName), left_(limits.maxBytes), limit_(limits.maxBytes), bytes_(kept + blockSize) {
+        : fileName_(fileName), limit_(limits.maxBytes), bytes_(kept + blockSize) {
         const int descriptor = ::open(fileName.c_str(), O_RDONLY | O_CLOEXEC);
         if (descriptor < 0) FN_THROW(FNEIOError, "gunzip(): cannot open " + fileName + " for reading");
         file_.reset(gzdopen(descriptor, "rb"));
@@ -25,6 +25,8 @@ public:
         }
         setg(block(), block(), block());
     }
+
+    void limitTo(std::uint64_t bytes) { limit_ = std::min(limit_, bytes); }
 
     void throwFailure() const {
         if (failure_) std::rethrow_exception(failure_);
@@ -61,10 +63,10 @@ private:
             if (n < 0 || (error != Z_OK && error != Z_STREAM_END))
                 FN_THROW(FNEIOError, "gunzip: error in gzread() with " + fileName_);
             const auto size = static_cast<std::size_t>(n);
-            if (size > left_)
+            size_ += size;
+            if (size_ > limit_)
                 FN_THROW(FNEBadFormat, "gunzip: " + fileName_ + " exceeds the limit of " +
                                            std::to_string(limit_) + " bytes for decoding");
-            left_ -= size;
             return size;
         } catch (...) {
             failure_ = std::current_exception();
@@ -73,8 +75,8 @@ private:
     }
 
     const std::string fileName_;
-    std::uint64_t left_;
-    const std::uint64_t limit_;
+    std::uint64_t size_ = 0; ///< of all that has come
+    std::uint64_t limit_;
     std::vector<char> bytes_;
     std::unique_ptr<gzFile_s, Close> file_;
     std::exception_ptr failure_;
@@ -86,6 +88,10 @@ GunzipStream::GunzipStream(const std::string& fileName, const ImageLimits& limit
 }
 
 GunzipStream::~GunzipStream() = default;
+
+void GunzipStream::limitTo(std::uint64_t bytes) {
+    buffer_->limitTo(bytes);
+}
 
 void GunzipStream::throwFailure() const {
     buffer_->throwFailure();

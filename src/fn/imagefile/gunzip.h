@@ -17,6 +17,9 @@ public:
     explicit GunzipStream(const std::string& fileName, const ImageLimits& limits = {});
     ~GunzipStream() override;
 
+    /// Lets no more than so many bytes come in all, if that is less than was allowed.
+    void limitTo(std::uint64_t bytes);
+
     /// A stream turns what goes wrong beneath into its own state; this tells it.
     /// @throws FNEIOError if the file was found to be damaged; FNEBadFormat if its content exceeds
     /// limits.maxBytes

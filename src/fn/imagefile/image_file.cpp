@@ -10,6 +10,8 @@
 #include "fn/imagefile/tiff.h"
 #include "fn/whole_file.h"
 
+#include <filesystem>
+
 namespace Fn {
 
 namespace {
@@ -30,8 +32,13 @@ FNImageReference readAnyFormat(std::istream& stream, const std::string& name, co
     if (start.empty()) FN_THROW(FNEBadArg, "Fn::readImage: cannot read " + name);
     if (start == "BM") return readBMP(stream, feedback, limits);
     if (start == "\x1F\x8B" && !fileName.empty()) {
+        // Formats that are read as a whole are held in memory: in proportion to the file, since photos are
+        // never compressed as much as zeros are.
+        constexpr std::uint64_t alwaysHeld = 1u << 26, heldForEachByte = 64;
         GunzipStream content(fileName, limits);
         try {
+            if (checkIfIsJ2k(content) || checkIfIsTiff(content))
+                content.limitTo(alwaysHeld + heldForEachByte * std::filesystem::file_size(fileName));
             const FNImageReference image = readAnyFormat(content, name, {}, feedback, limits);
             content.throwFailure();
             return image;

@@ -88,50 +88,109 @@ template <class Gray, class Color> FNImageReference toReference(const Samples& s
     return FNImageReferenceFactory::create(image);
 }
 
-/// Where the coded data that begin at `at` end: at the next marker, or with the file.
-std::size_t scanEnd(const FNRMem<unsigned char>& file, std::size_t at) {
-    const unsigned char* const bytes = file.data();
-    for (; at < file.size(); ++at)
-        if (bytes[at] == 0xFF && (at + 1 == file.size() || bytes[at + 1] >= 0x80)) return at;
-    return file.size();
-}
+constexpr unsigned char startMarker = 0xD8, scanMarker = 0xDA, firstRestartMarker = 0xD0,
+                        restartIntervalMarker = 0xDD, endMarker = 0xD9;
 
-/// Where the coded data of each scan end. @throws FNEBadFormat if a restart marker ends one
-std::vector<std::size_t> scanEnds(const FNRMem<unsigned char>& file) {
-    constexpr std::size_t mostScans = 4;
-    constexpr unsigned char startMarker = 0xD8, scanMarker = 0xDA, restartMarker = 0xD0;
-    const unsigned char* const bytes = file.data();
-    std::vector<std::size_t> ends;
-    for (std::size_t at = 0; at + 4 <= file.size() && bytes[at] == 0xFF && ends.size() < mostScans;) {
-        const unsigned char marker = bytes[++at];
-        if (marker == 0xFF) continue; // any number of these may stand before a marker
-        ++at;
-        if (marker == startMarker) continue; // has no segment
-        at += std::size_t{bytes[at]} << 8 | bytes[at + 1];
-        if (marker != scanMarker) continue;
-        at = scanEnd(file, at);
-        if (at + 1 < file.size() && (bytes[at + 1] & 0xF8) == restartMarker)
-            FN_THROW(FNEBadFormat, "readJpegLS(): Parameter value not supported");
-        ends.push_back(at);
+/// A stretch of coded data, without the marker that ends it. Each begins anew, as if it were an image of its
+/// own.
+struct Interval {
+    std::size_t begin, end;
+};
+
+/// What the segments of a file tell.
+struct Segments {
+    std::size_t frame = 0;                    ///< where the content of the frame's header begins
+    std::vector<Interval> restarts;           ///< contents of the segments of restart intervals
+    std::vector<std::vector<Interval>> scans; ///< each with its restart intervals
+
+    explicit Segments(const FNRMem<unsigned char>& file) {
+        constexpr std::size_t mostScans = 4;
+        const unsigned char* const bytes = file.data();
+        for (std::size_t at = 0; at + 4 <= file.size() && bytes[at] == 0xFF && scans.size() < mostScans;) {
+            const unsigned char marker = bytes[++at];
+            if (marker == 0xFF) continue; // any number of these may stand before a marker
+            ++at;
+            if (marker == startMarker) continue; // has no segment
+            const std::size_t content = at + 2;
+            at += std::size_t{bytes[at]} << 8 | bytes[at + 1];
+            if (marker == frameMarker) frame = content;
+            if (marker == restartIntervalMarker) restarts.push_back({content, std::min(at, file.size())});
+            if (marker == scanMarker) at = addScan(file, at);
+        }
     }
-    return ends;
-}
+
+private:
+    static constexpr unsigned char frameMarker = 0xF7;
+
+    /// @return where the scan that begins at `at` ends: at the next marker but those of restarts, or with the
+    /// file
+    std::size_t addScan(const FNRMem<unsigned char>& file, std::size_t at) {
+        const unsigned char* const bytes = file.data();
+        std::vector<Interval>& intervals = scans.emplace_back(1, Interval{at, file.size()});
+        for (; at < file.size(); ++at) {
+            if (bytes[at] != 0xFF || (at + 1 < file.size() && bytes[at + 1] < 0x80)) continue;
+            intervals.back().end = at;
+            if (at + 1 == file.size() || (bytes[at + 1] & 0xF8) != firstRestartMarker) return at;
+            intervals.push_back({at + 2, file.size()});
+            ++at;
+        }
+        return file.size();
+    }
+};
 
 /// CharLS 2.4 counts zero bits behind the end of a scan for seconds if a code is cut off there. With zeros
 /// before the end it stops at them, so that a scan is tried in this way first. A whole one then seems to be
 /// too long.
 /// @throws charls::jpegls_error for a cut one
-void refuseCutScans(const FNRMem<unsigned char>& file, std::vector<unsigned char>& samples) {
+void refuseIfCut(std::vector<unsigned char> file, std::size_t end, std::vector<unsigned char>& samples) {
     constexpr std::size_t zeros = 32;
-    for (const std::size_t end : scanEnds(file)) {
-        std::vector<unsigned char> padded(file.begin(), file.begin() + end);
-        padded.resize(end + zeros);
-        padded.insert(padded.end(), file.begin() + end, file.end());
-        try {
-            charls::jpegls_decoder(padded, true).decode(samples);
-        } catch (const charls::jpegls_error& error) {
-            if (error.code() != charls::jpegls_errc::too_much_encoded_data) throw;
-        }
+    file.insert(file.begin() + static_cast<std::ptrdiff_t>(end), zeros, 0);
+    try {
+        charls::jpegls_decoder(file, true).decode(samples);
+    } catch (const charls::jpegls_error& error) {
+        if (error.code() != charls::jpegls_errc::too_much_encoded_data) throw;
+    }
+}
+
+/// An interval of a file of one scan as a file of its own.
+std::vector<unsigned char> fileOfInterval(const FNRMem<unsigned char>& file, const Segments& segments,
+                                          std::size_t index, std::uint32_t rows) {
+    const std::vector<Interval>& intervals = segments.scans.front();
+    std::vector<unsigned char> alone(file.begin(), file.begin() + intervals.front().begin);
+    for (const Interval& restart : segments.restarts)
+        std::fill(alone.begin() + static_cast<std::ptrdiff_t>(restart.begin),
+                  alone.begin() + static_cast<std::ptrdiff_t>(restart.end), 0); // none
+    alone[segments.frame + 1] = static_cast<unsigned char>(rows >> 8);
+    alone[segments.frame + 2] = static_cast<unsigned char>(rows);
+    alone.insert(alone.end(), file.begin() + intervals[index].begin, file.begin() + intervals[index].end);
+    alone.insert(alone.end(), {0xFF, endMarker});
+    return alone;
+}
+
+/// @throws charls::jpegls_error if a scan is cut off; FNEBadFormat for restart intervals that are not read
+void refuseCutScans(const FNRMem<unsigned char>& file, std::uint32_t height,
+                    std::vector<unsigned char>& samples) {
+    const Segments segments(file);
+    bool restarts = false;
+    for (const auto& intervals : segments.scans) restarts = restarts || intervals.size() > 1;
+    if (!restarts) {
+        for (const auto& intervals : segments.scans)
+            refuseIfCut({file.begin(), file.end()}, intervals.front().end, samples);
+        return;
+    }
+    if (segments.scans.size() != 1 || segments.restarts.size() != 1 || segments.frame == 0)
+        FN_THROW(FNEBadFormat,
+                 "readJpegLS(): restart markers are read in files of one scan and one interval only");
+    std::uint32_t rowsEach = 0;
+    const Interval& stored = segments.restarts.front();
+    for (std::size_t i = stored.begin; i < stored.end; ++i) rowsEach = rowsEach << 8 | file.data()[i];
+    std::uint32_t left = height;
+    for (std::size_t i = 0; i < segments.scans.front().size(); ++i) {
+        const std::uint32_t rows = std::min(rowsEach, left);
+        if (rows == 0) FN_THROW(FNEBadFormat, "readJpegLS(): Invalid compressed data");
+        const std::vector<unsigned char> alone = fileOfInterval(file, segments, i, rows);
+        refuseIfCut(alone, alone.size() - 2, samples);
+        left -= rows;
     }
 }
 
@@ -151,10 +210,11 @@ FNImageReference decode(const FNRMem<unsigned char>& file, const ReadImageProper
 
     const unsigned sampleSize = bits > 8 ? 2 : 1;
     const unsigned resultSize = components == 1 ? sampleSize : bits > 8 ? sizeof(Rgb48) : sizeof(Bgra32);
-    limits.check(samples.frame.width, samples.frame.height,
-                 static_cast<unsigned>(components) * sampleSize + resultSize, "readJpegLS()");
+    limits.beside(file.size())
+        .check(samples.frame.width, samples.frame.height,
+               static_cast<unsigned>(components) * sampleSize + resultSize, "readJpegLS()");
     samples.bytes.resize(decoder.destination_size());
-    refuseCutScans(file, samples.bytes);
+    refuseCutScans(file, samples.frame.height, samples.bytes);
     decoder.decode(samples.bytes);
     return bits > 8 ? toReference<unsigned short, Rgb48>(samples)
                     : toReference<unsigned char, Bgra32>(samples);

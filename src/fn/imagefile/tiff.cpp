@@ -42,6 +42,15 @@ struct Source {
     }
     static toff_t size(thandle_t self) { return static_cast<Source*>(self)->bytes.size(); }
     static int close(thandle_t) { return 0; }
+    /// The bytes where they lie: without this, libtiff copies them, and 4.5.0 with Debian's corrections then
+    /// takes no uncompressed tiles.
+    static int map(thandle_t self, void** base, toff_t* size) {
+        auto& source = *static_cast<Source*>(self);
+        *base = const_cast<unsigned char*>(source.bytes.data()); // only ever read
+        *size = source.bytes.size();
+        return 1;
+    }
+    static void unmap(thandle_t, void*, toff_t) {}
 
     static int onError(TIFF*, void* self, const char*, const char* format, std::va_list arguments) {
         char text[200];
@@ -64,9 +73,8 @@ Tiff open(Source& source, const std::string& name, const ImageLimits& limits) {
     TIFFOpenOptionsSetMaxSingleMemAlloc(options.get(), static_cast<tmsize_t>(limits.maxBytes / 2));
     TIFFOpenOptionsSetErrorHandlerExtR(options.get(), Source::onError, &source);
     TIFFOpenOptionsSetWarningHandlerExtR(options.get(), Source::onWarning, &source);
-    // "m": no memory mapping
-    Tiff tiff(TIFFClientOpenExt(name.c_str(), "rm", &source, Source::read, Source::write, Source::seek,
-                                Source::close, Source::size, nullptr, nullptr, options.get()));
+    Tiff tiff(TIFFClientOpenExt(name.c_str(), "r", &source, Source::read, Source::write, Source::seek,
+                                Source::close, Source::size, Source::map, Source::unmap, options.get()));
     if (!tiff) FN_THROW(FNEBadFormat, "Fn::readTiff(): stream might be not in TIFF format (" + name + ")");
     return tiff;
 }

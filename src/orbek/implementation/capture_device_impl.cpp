@@ -6,7 +6,9 @@
 namespace Orbek {
 
 Fn::LiveVideoSource& CaptureDeviceImpl::source() const {
-    if (!source_) FN_THROW(FNEBadFunCall, "The capture device " + key_ + " has no source of images");
+    if (!source_)
+        FN_THROW(FNEBadFunCall, "The capture device " + key_ + " has no source of images" +
+                                    (reason_.empty() ? "" : ": " + reason_));
     return *source_;
 }
 
@@ -15,7 +17,9 @@ Image CaptureDeviceImpl::capture() {
 }
 
 Image CaptureDeviceImpl::release() {
-    if (!stillSource_) FN_THROW(FNEBadFunCall, "The capture device " + key_ + " takes no single pictures");
+    if (!stillSource_)
+        FN_THROW(FNEBadFunCall, "The capture device " + key_ + " takes no single pictures" +
+                                    (reason_.empty() ? "" : ": " + reason_));
     const FNRMem<unsigned char> bytes = stillSource_->release();
     return adapt(stillSource_->extractImage(bytes, adapt(ImageIO::noFeedback())), stillSource_->name());
 }

@@ -10,10 +10,13 @@ class CaptureDeviceImpl final : public CaptureDeviceBody {
 public:
     /// @param key of the device in the configuration, for messages
     /// @param grabber either handle may be null
+    /// @param reason why they are, for messages; empty if that is not known
     /// @param controlled whether the configuration has a camera controller for the device. There is none in
     /// the library yet: control() throws FNEBadFunCall then.
-    CaptureDeviceImpl(const std::string& key, const FG::GrabberPair& grabber, bool controlled)
-        : key_(key), source_(grabber.first), stillSource_(grabber.second), controlled_(controlled) {}
+    CaptureDeviceImpl(const std::string& key, const FG::GrabberPair& grabber, const std::string& reason,
+                      bool controlled)
+        : key_(key), source_(grabber.first), stillSource_(grabber.second), reason_(reason),
+          controlled_(controlled) {}
 
     Image capture() override;
     Image release() override;
@@ -31,6 +34,7 @@ private:
     std::string key_;
     FNCountedPtr<Fn::LiveVideoSource> source_;
     FNCountedPtr<FG::StillImageSource> stillSource_;
+    std::string reason_;
     bool controlled_;
 };
 

@@ -47,12 +47,25 @@ protected:
         workshop.write("widecolor.ppm", netpbm(wideColorPicture()));
     }
 
-    void expect(const std::vector<Accepted>& files) const {
+    /// What only readers that take rare variants read.
+    void expectRare(const std::vector<Accepted>& files) const {
+        for (const Accepted& c : files) {
+            SCOPED_TRACE(c.command);
+            workshop.run(c.command);
+            EXPECT_THROW(Fn::readImage(workshop.path(c.file)), FNException);
+        }
+        expect(files, Fn::ImageLimits::withRareVariants());
+    }
+
+    void expect(const std::vector<Accepted>& files, const Fn::ImageLimits& limits = {}) const {
         for (const Accepted& c : files) {
             SCOPED_TRACE(c.command);
             workshop.run(c.command);
             const RecordedProperties properties;
-            const FNImageReference read = Fn::readImage(workshop.path(c.file), properties.feedback);
+            FNImageReference read;
+            EXPECT_EQ(
+                thrownBy([&] { read = Fn::readImage(workshop.path(c.file), properties.feedback, limits); }),
+                "nothing thrown");
             EXPECT_EQ(read.native(), c.native);
             EXPECT_EQ(properties.mode(), c.mode);
             EXPECT_EQ(properties.depth(), c.depth);
@@ -92,6 +105,17 @@ TEST_F(ForeignFiles, Jpeg) {
         {"cjpeg -quality 95 -outfile a.jpg color.ppm", "a.jpg", color, bgra32, yCbCr, 24, 25},
         {"cjpeg " + best + "-outfile a.jpg gray.pgm", "a.jpg", gray, mono8, intensity, 8, 3},
         {"cjpeg " + best + "-progressive -outfile a.jpg gray.pgm", "a.jpg", gray, mono8, intensity, 8, 3},
+    });
+}
+
+TEST_F(ForeignFiles, JpegOfFourComponents) {
+    if (!Workshop::has("convert")) GTEST_SKIP() << "ImageMagick is not installed";
+    const std::string flat = "convert -size 13x9 'xc:#20C060' -colorspace CMYK -quality 100 ";
+    FNImage<Fn::Bgra32> green(13, 9);
+    green.fill({0x20, 0xC0, 0x60});
+    expectRare({
+        {flat + "a.jpg", "a.jpg", Factory::create(green), bgra32, yCbCrK, 32, 3},
+        {"convert color.ppm -colorspace CMYK -quality 100 a.jpg", "a.jpg", color, bgra32, yCbCrK, 32, 6},
     });
 }
 
@@ -218,6 +242,35 @@ TEST_F(ForeignFiles, Tiff) {
     });
 }
 
+TEST_F(ForeignFiles, TiffThatTheLibraryConverts) {
+    if (!Workshop::has("convert") || !Workshop::has("tiffcp"))
+        GTEST_SKIP() << "ImageMagick or libtiff's tools are not installed";
+    workshop.run("convert gray.pgm -compress None gray.tif");
+    workshop.run("convert color.ppm -compress None color.tif");
+    workshop.run("convert widecolor.ppm -compress None widecolor.tif");
+    const auto coarse = [](unsigned bits) { return Factory::create(coarsePicture(bits)); };
+    const FNImageReference narrow = Factory::create(Factory::create(wideColorPicture()).toBgra32());
+    constexpr int separated = 27;
+    expectRare({
+        {"convert gray1.pgm -monochrome -compress Fax a.tif", "a.tif", coarse(1), mono8, intensity, 1},
+        {"convert gray1.pgm -monochrome -compress Group4 a.tif", "a.tif", coarse(1), mono8, intensity, 1},
+        {"convert gray4.pgm -depth 4 -compress LZW a.tif", "a.tif", coarse(4), mono8, intensity, 4},
+        {"convert color.ppm -type Palette a.tif", "a.tif", color, bgra32, palette, 8},
+        {"convert color.ppm -colorspace CMYK a.tif", "a.tif", color, bgra32, separated, 32, 3},
+        {"convert gray.pgm -alpha set -compress None a.tif", "a.tif", gray, mono8, intensity, 16},
+        {"tiffcp -t -w 16 -l 16 color.tif a.tif", "a.tif", color, bgra32, rgb, 24},
+        {"tiffcp -t -w 16 -l 16 gray.tif a.tif", "a.tif", gray, mono8, intensity, 8},
+        {"tiffcp -t -w 16 -l 16 widecolor.tif a.tif", "a.tif", narrow, bgra32, rgb, 48, 1},
+        {"tiffcp -p separate color.tif a.tif", "a.tif", color, bgra32, rgb, 24},
+        {"tiffcp -c jpeg:100 color.tif a.tif", "a.tif", color, bgra32, yCbCr, 24, 25},
+    });
+    // The rows stay as they are stored, whatever the file tells of its orientation.
+    workshop.run("tiffcp -p separate color.tif a.tif && tiffset -s 274 3 a.tif");
+    EXPECT_EQ(largestDifference(
+                  Fn::readImage(workshop.path("a.tif"), {}, Fn::ImageLimits::withRareVariants()), color),
+              0);
+}
+
 TEST_F(ForeignFiles, TiffOfOtherLayouts) {
     if (!Workshop::has("convert") || !Workshop::has("tiffcp"))
         GTEST_SKIP() << "ImageMagick or libtiff's tools are not installed";
@@ -258,6 +311,35 @@ TEST_F(ForeignFiles, Bmp) {
         {"convert color.ppm BMP2:a.bmp", "a.bmp", "FNESysError: BMP Error: Unknown BMP type or wrong header"},
         {"convert gray.pgm -type Palette -compress RLE BMP3:a.bmp", "a.bmp",
          "FNEBadArg: Unknown biCompression type"},
+    });
+}
+
+TEST_F(ForeignFiles, BmpOfLaterVersionsAndRunLengths) {
+    if (!Workshop::has("convert")) GTEST_SKIP() << "ImageMagick is not installed";
+    const auto coarse = [](unsigned bits) { return Factory::create(coarsePicture(bits)); };
+    const std::string half = "-alpha set -channel A -evaluate set 50% +channel ";
+    constexpr int bitFields = 14, rle8 = 12;
+    expectRare({
+        {"convert color.ppm a.bmp", "a.bmp", color, bgra32, rgb, 24},
+        {"convert color.ppm BMP4:a.bmp", "a.bmp", color, bgra32, rgb, 24},
+        {"convert color.ppm " + half + "a.bmp", "a.bmp", color, bgra32, bitFields, 32},
+        {"convert gray1.pgm -type Bilevel -compress None a.bmp", "a.bmp", coarse(1), bgra32, rgb, 1},
+        {"convert gray4.pgm -type Palette -compress None a.bmp", "a.bmp", coarse(4), bgra32, rgb, 4},
+        {"convert gray.pgm -type Palette -compress RLE BMP3:a.bmp", "a.bmp", gray, bgra32, rle8, 8, 4},
+        {"convert gray4.pgm -type Palette -compress RLE a.bmp", "a.bmp", coarse(4), bgra32, rle8, 8},
+    });
+}
+
+TEST_F(ForeignFiles, PlainNetpbmAndBitmaps) {
+    if (!Workshop::has("convert")) GTEST_SKIP() << "ImageMagick is not installed";
+    const FNImageReference black = Factory::create(coarsePicture(1));
+    expectRare({
+        {"convert gray1.pgm a.pbm", "a.pbm", black, mono8, intensity, 1},
+        {"convert gray1.pgm -compress None a.pbm", "a.pbm", black, mono8, intensity, 1},
+        {"convert gray.pgm -compress None a.pgm", "a.pgm", gray, mono8, intensity, 8},
+        {"convert wide.pgm -compress None a.pgm", "a.pgm", wide, mono16, intensity, 16},
+        {"convert color.ppm -compress None a.ppm", "a.ppm", color, bgra32, rgb, 24},
+        {"convert widecolor.ppm -compress None a.ppm", "a.ppm", wideColor, rgb48, rgb, 48},
     });
 }
 

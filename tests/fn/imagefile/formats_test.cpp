@@ -112,6 +112,7 @@ TEST(ReadImage, WorksOnAStreamThatCannotSeek) {
         Pipe pipe(bytesOfFile(fixture(name)));
         std::istream stream(&pipe);
         EXPECT_EQ(largestDifference(Fn::readImage(stream), Fn::readImage(fixture(name))), 0) << name;
+        EXPECT_FALSE(stream.fail()) << name;
     }
 }
 
@@ -214,8 +215,12 @@ TEST(Jpeg, DamageThatCanBeBridgedGivesAWarning) {
     const RecordedDialog dialog;
     const std::string bytes = bytesOfFile(fixture("jpeg/color_420_restart.jpg"));
     EXPECT_EQ(Fn::readImage(bytes.data(), bytes.size() - 10).w(), 13u);
-    ASSERT_EQ(dialog.messages().size(), 1u);
+    const Workshop workshop;
+    workshop.write("cut.jpg", bytes.substr(0, bytes.size() - 10));
+    Fn::loadJpeg(workshop.path("cut.jpg"));
+    ASSERT_EQ(dialog.messages().size(), 2u);
     EXPECT_THAT(dialog.messages()[0], StartsWith("warn: jpeg lib warning(s): "));
+    EXPECT_THAT(dialog.messages()[1], testing::EndsWith(" in " + workshop.path("cut.jpg")));
 }
 
 // ---- PNG
@@ -312,6 +317,49 @@ TEST(JpegLS, ReadsBackEveryPixelType) {
               "FNESysError: writeJpegLS(): Invalid JlsParameters");
 }
 
+TEST(JpegLS, RestartIntervalsAreReadAndCutOnesRefused) {
+    // Each interval begins anew, so that files of its rows put together make a file with restarts.
+    for (const FNImageReference& image : allPixelTypes()) {
+        std::string whole;
+        constexpr std::uint32_t rowsEach = 4;
+        int number = 0;
+        std::vector<std::size_t> ends;
+        for (std::uint32_t y = 0; y < image.h(); y += rowsEach, ++number) {
+            const FNBox box(0, static_cast<int>(y), static_cast<int>(image.w()),
+                            static_cast<int>(std::min(y + rowsEach, image.h())));
+            std::stringstream part;
+            Fn::writePbm(image, part, box);
+            const std::string file = text(Fn::writeJpegLS(Fn::readPbm(part)));
+            const std::size_t scan = file.find("\xFF\xDA"),
+                              data = scan + 2 + static_cast<unsigned char>(file[scan + 3]);
+            if (number == 0) {
+                whole = file.substr(0, scan) + std::string("\xFF\xDD\0\4\0\4", 6) +
+                        file.substr(scan, data - scan);
+                const std::size_t frame = whole.find("\xFF\xF7");
+                whole[frame + 6] = static_cast<char>(image.h());
+            } else {
+                ends.push_back(whole.size());
+                whole += {'\xFF', static_cast<char>(0xD0 + number - 1)};
+            }
+            whole += file.substr(data, file.size() - 2 - data);
+        }
+        ends.push_back(whole.size());
+        whole += "\xFF\xD9";
+        const FNImageReference read = Fn::readJpegLS(whole.data(), whole.size());
+        EXPECT_EQ(read.toRgb48(), image.toRgb48());
+        for (const std::size_t end : ends) {
+            std::string cut = whole;
+            cut.erase(end - 3, 3);
+            EXPECT_THROW(Fn::readJpegLS(cut.data(), cut.size()), FNEBadFormat);
+        }
+        const std::string twice =
+            std::string(whole).insert(whole.find("\xFF\xDD"), std::string("\xFF\xDD\0\4\0\4", 6));
+        EXPECT_EQ(thrownBy([&] { Fn::readJpegLS(twice.data(), twice.size()); }),
+                  "FNEBadFormat: readJpegLS(): restart markers are read in files of one scan and one "
+                  "interval only");
+    }
+}
+
 TEST(JpegLS, NoiseThatGrowsByCompressionIsWritten) {
     FNImage<unsigned short> noise(300, 300);
     std::mt19937 random(5);
@@ -406,6 +454,43 @@ TEST(Pbm, SamplesAreStretchedToTheFullRange) {
     EXPECT_EQ(std::vector<int>(read.data(), read.data() + 6), (std::vector<int>{0, 128, 255, 64, 191, 252}));
     std::istringstream wide(std::string("P6 1 1 256 \0\0\1\0\2\0", 17));
     EXPECT_EQ(Fn::readPpm(wide).toRgb48()(0, 0), Fn::Rgb48(0, 65535, 65535));
+}
+
+TEST(Pbm, PlainFormsAndBitmapsAreRareVariants) {
+    const Fn::ImageLimits rare = Fn::ImageLimits::withRareVariants();
+    const struct {
+        std::string file;
+        std::vector<unsigned> samples; ///< of 16 bits for those of more than 8
+    } cases[] = {
+        {"P1 3 2\n010 1\n#comment\n1 0", {255, 0, 255, 0, 0, 255}},
+        {std::string("P4 9 2\n\x80\x80\x7F\0", 11),
+         {0, 255, 255, 255, 255, 255, 255, 255, 0, 255, 0, 0, 0, 0, 0, 0, 0, 255}},
+        {"P2 3 1 10\n0 5\t#c\n99999999999", {0, 128, 255}},
+        {"P2 2 1 1000\n0 500\n", {0, 32768}},
+        {"P3 1 1 255\n1 2 3", {1, 2, 3}},
+        {"P3 1 1 65535 1 2 65535 ", {1, 2, 65535}},
+    };
+    for (const auto& c : cases) {
+        const FNImageReference image = Fn::readImage(c.file.data(), c.file.size(), {}, rare);
+        const FNImage<Fn::Rgb48> wide = image.toRgb48();
+        const FNImage<Bgra32> narrow = image.toBgra32();
+        std::vector<unsigned> samples;
+        for (std::uint64_t i = 0; i < wide.size(); ++i) {
+            const bool deep =
+                image.native() == FNImageReference::MONO16 || image.native() == FNImageReference::RGB48;
+            const Fn::Rgb48& w = wide.data()[i];
+            const Bgra32& n = narrow.data()[i];
+            for (const unsigned s : {deep ? w.r : n.r, deep ? w.g : n.g, deep ? w.b : n.b}) {
+                samples.push_back(s);
+                if (!image.isColor()) break;
+            }
+        }
+        EXPECT_EQ(samples, c.samples) << c.file;
+        EXPECT_THROW(Fn::readImage(c.file.data(), c.file.size()), FNEBadArg);
+    }
+    for (const std::string file : {"P1 2 1\n1", "P1 1 1\n2", "P2 1 1 255\n", "P2 1 1 255\nx",
+                                   "P2 1 1 255\n1x", "P2 1 1 255\n-1", "P4 9 1\n1", "P3 1 1 255\n1 2"})
+        EXPECT_THROW(Fn::readImage(file.data(), file.size(), {}, rare), FNEIOError) << file;
 }
 
 TEST(Pbm, RefusesInItsOwnWords) {
@@ -515,6 +600,83 @@ TEST(Bmp, EveryDepthAndCodingGivesItsPixels) {
         EXPECT_EQ(image.native(), FNImageReference::BGRA32);
         const FNImage<Bgra32> pixels = image.toBgra32();
         EXPECT_EQ(std::vector<Bgra32>(pixels.data(), pixels.data() + pixels.size()), c.pixels) << c.name;
+    }
+}
+
+TEST(Bmp, ThePixelsBeginWhereTheHeaderTells) {
+    const auto at = [](std::string file, unsigned char offset) {
+        file[10] = static_cast<char>(offset);
+        return file;
+    };
+    const std::string pixels = "abc-", gap = "gap!!", table(8, '\0');
+    const Bgra32 expected('c', 'b', 'a');
+    // Behind the headers, and within them or the colour table, where it cannot be right.
+    EXPECT_EQ(readBmp(at(bmpFile(1, 1, 24, "0", gap, pixels), 59)).toBgra32()(0, 0), expected);
+    EXPECT_EQ(readBmp(at(bmpFile(1, 1, 24, "0", table + gap, pixels, 2), 67)).toBgra32()(0, 0), expected);
+    for (const unsigned char offset : {0, 20, 54, 61})
+        EXPECT_EQ(readBmp(at(bmpFile(1, 1, 24, "0", table, pixels, 2), offset)).toBgra32()(0, 0), expected);
+    EXPECT_EQ(thrownBy([&] { readBmp(at(bmpFile(1, 1, 24, "0", "", pixels), 200)); }),
+              "FNEIOError: BMP Error: reading BMP pixels");
+}
+
+/// Indices of what a reader of rare variants finds, row by row from the top; the colour table tells them.
+std::string runLengthIndices(const std::string& coding, int w, int h, const std::string& runs) {
+    const bool nibbles = coding == "2";
+    std::string table;
+    for (int i = 0; i < (nibbles ? 16 : 256); ++i) table += {static_cast<char>(i), 0, 0, 0};
+    const std::string file = bmpFile(w, h, nibbles ? 4 : 8, coding, table, runs);
+    const FNImage<Bgra32> read =
+        Fn::readImage(file.data(), file.size(), {}, Fn::ImageLimits::withRareVariants()).toBgra32();
+    std::string indices;
+    for (const Bgra32& p : read.span()) indices += static_cast<char>('0' + p.b);
+    return indices;
+}
+
+TEST(Bmp, RunLengthsGiveTheirPixels) {
+    const std::string end("\0\1", 2), row("\0\0", 2);
+    const struct {
+        const char *name, *coding;
+        int w, h;
+        std::string runs, indices;
+    } cases[] = {
+        {"rows from the bottom", "1", 3, 2, "\3\1" + row + "\1\2\2\3" + end, "233111"},
+        {"top to bottom", "1", 3, -2, "\3\1" + row + "\1\2\2\3" + end, "111233"},
+        {"stored pixels, padded", "1", 4, 1, std::string("\0\3\1\2\3\0\1\4", 8) + end, "1234"},
+        {"a jump", "1", 4, 2, std::string("\1\5\0\2\2\1\1\6", 8) + end, "00065000"},
+        {"runs beyond the row", "1", 2, 2, "\7\1" + row + "\7\2\7\3" + end, "2211"},
+        {"rows beyond the picture", "1", 2, 1, "\2\1" + row + "\2\2" + end, "11"},
+        {"an early end", "1", 2, 2, "\2\1" + end, "0011"},
+        {"no end mark", "1", 2, 1, "\2\1", "11"},
+        {"halves of bytes in turn", "2", 5, 1, "\5\x12" + end, "12121"},
+        {"stored halves", "2", 5, 1, std::string("\0\5\x12\x34\x50\0", 6) + end, "12345"},
+        {"stored halves of whole words", "2", 6, 1, std::string("\0\4\x12\x34\2\x56", 6) + end, "123456"},
+    };
+    for (const auto& c : cases) EXPECT_EQ(runLengthIndices(c.coding, c.w, c.h, c.runs), c.indices) << c.name;
+    for (const std::string& cut : {std::string("\1"), std::string("\1\2"), std::string("\0\2\1", 3),
+                                   std::string("\0\4\1\2", 4), std::string("\0\3\1\2\3", 5)})
+        EXPECT_EQ(thrownBy([&] { runLengthIndices("1", 4, 1, cut); }),
+                  "FNEIOError: BMP Error: reading BMP pixels");
+    EXPECT_EQ(thrownBy([&] { readBmp(bmpFile(2, 1, 8, "1", std::string(1024, '\0'), "\2\1" + end)); }),
+              "FNEBadArg: Unknown biCompression type");
+    const std::string wrong = bmpFile(2, 1, 4, "1", std::string(64, '\0'), "\2\1" + end);
+    EXPECT_EQ(
+        thrownBy([&] { Fn::readImage(wrong.data(), wrong.size(), {}, Fn::ImageLimits::withRareVariants()); }),
+        "FNEBadArg: BMP Error: biBitCount 4 not supported with run lengths");
+}
+
+TEST(Bmp, LaterHeadersBringTheirMasks) {
+    // Masks of red, green, blue and alpha, in the bytes of "abcd" from the last to the first.
+    const std::string masks("\0\0\0\xFF\0\0\xFF\0\0\xFF\0\0\xFF\0\0\0", 16);
+    for (const int size : {52, 56, 108, 124}) {
+        std::string file = bmpFile(1, 1, 32, "3", masks.substr(0, size == 52 ? 12 : 16), "");
+        file.resize(static_cast<std::size_t>(14 + size), '\0');
+        file[14] = static_cast<char>(size);
+        file += "abcd";
+        const FNImageReference image =
+            Fn::readImage(file.data(), file.size(), {}, Fn::ImageLimits::withRareVariants());
+        EXPECT_EQ(image.toBgra32()(0, 0), Bgra32('d', 'c', 'b', size == 52 ? 255 : 'a')) << size;
+        EXPECT_EQ(thrownBy([&] { readBmp(file); }),
+                  "FNESysError: BMP Error: Unknown BMP type or wrong header");
     }
 }
 

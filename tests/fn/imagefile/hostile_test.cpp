@@ -26,31 +26,49 @@ FNImageReference readFixture(const std::filesystem::path& path, const std::strin
 
 TEST(HostileFiles, EveryTruncatedFixtureDecodesOrThrows) {
     const RecordedDialog dialog; // truncated JPEG files give warnings
-    for (const auto& path : fixtures()) {
-        const std::string whole = bytesOfFile(path);
-        int decoded = 0;
-        for (std::size_t size = 0; size < whole.size(); ++size) {
-            try {
-                decoded += readFixture(path, whole.substr(0, size)).w() != 0;
-            } catch (const FNException&) {
+    for (const Fn::ImageLimits& limits : {Fn::ImageLimits(), Fn::ImageLimits::withRareVariants()})
+        for (const auto& path : fixtures()) {
+            const std::string whole = bytesOfFile(path);
+            int decoded = 0;
+            for (std::size_t size = 0; size < whole.size(); ++size) {
+                try {
+                    decoded += readFixture(path, whole.substr(0, size), limits).w() != 0;
+                } catch (const FNException&) {
+                }
+            }
+            // Without its last byte, only JPEG and what has no end mark can still be an image.
+            EXPECT_LT(decoded, static_cast<int>(whole.size())) << path;
+            if (isRefused(path, limits)) {
+                EXPECT_THROW(readFixture(path, whole, limits), FNException) << path;
+            } else {
+                EXPECT_NO_THROW(readFixture(path, whole, limits)) << path;
             }
         }
-        // Without its last byte, only JPEG and what has no end mark can still be an image.
-        EXPECT_LT(decoded, static_cast<int>(whole.size())) << path;
-        if (isRefused(path)) {
-            EXPECT_THROW(readFixture(path, whole), FNException) << path;
-        } else {
-            EXPECT_NO_THROW(readFixture(path, whole)) << path;
-        }
-    }
+}
+
+TEST(HostileFiles, NewLimitsAreTheDefaultsOfTheProcess) {
+    const Fn::ImageLimits before;
+    EXPECT_EQ(before.maxWidth, 65535u);
+    EXPECT_EQ(before.maxHeight, 65535u);
+    EXPECT_EQ(before.maxPixels, 134217728u);
+    EXPECT_EQ(before.maxBytes, 1073741824u);
+    const std::string row = "P5 70000 1 255\n" + std::string(70000, 'x');
+    EXPECT_EQ(thrownBy([&] { Fn::readImage(row.data(), row.size()); }),
+              "FNEBadFormat: Fn::readPbm: image of 70000 x 1 pixels exceeds the limit of 65535 columns");
+    Fn::ImageLimits wide = Fn::ImageLimits::withRareVariants();
+    wide.maxWidth = 70000;
+    Fn::ImageLimits::setDefaults(wide);
+    EXPECT_EQ(Fn::readImage(row.data(), row.size()).w(), 70000u);
+    EXPECT_FALSE(Fn::ImageLimits().rareVariants) << "is asked for where it is wanted";
+    Fn::ImageLimits::setDefaults(before);
 }
 
 TEST(HostileFiles, LimitsHoldForEveryFormat) {
     for (const auto& path : fixtures()) {
-        if (isRefused(path)) continue;
+        Fn::ImageLimits exact = Fn::ImageLimits::withRareVariants();
+        if (isRefused(path, exact)) continue;
         const std::string bytes = bytesOfFile(path);
-        const FNImageReference image = readFixture(path, bytes);
-        Fn::ImageLimits exact;
+        const FNImageReference image = readFixture(path, bytes, exact);
         exact.maxWidth = image.w();
         exact.maxHeight = image.h();
         exact.maxPixels = std::uint64_t{image.w()} * image.h();
@@ -99,6 +117,8 @@ TEST(HostileFiles, HugeAnnouncementsCostNoMemory) {
                  big(8192, 4) + big(8192, 4) + big(0, 4) + big(0, 4) + big(1, 4) + big(1, 4))},
         {"JPEG-LS", patched(load("jpegls/t87_h3.jls"), "\xFF\xF7", 5, widestShort)},
         {"PNG", patched(load("png/gray1.png"), "IHDR", 4, widest)},
+        {"PNG text", load("png/gray1.png").substr(0, 33) + big(1u << 30, 4) + "tEXt" + "key"},
+        {"PNG of unknown chunks", load("png/gray1.png").substr(0, 33) + big(1u << 30, 4) + "abCd" + "key"},
     };
     rusage before{}, after{};
     getrusage(RUSAGE_SELF, &before);
@@ -121,6 +141,37 @@ TEST(HostileFiles, AManyScanJpegIsCutShort) {
     const RecordedDialog dialog;
     EXPECT_EQ(thrownBy([&] { Fn::readImage(many.data(), many.size()); }).substr(0, 40),
               "FNEBadArg: jpeg lib error:Too many scans");
+}
+
+TEST(HostileFiles, AGzipFileCostsTheMemoryOfItsPicture) {
+    if (!Workshop::has("gzip")) GTEST_SKIP() << "gzip is not installed";
+    const Workshop workshop;
+    workshop.write("a.pgm", "P5 1 1 255\nx");
+    workshop.run("{ cat a.pgm; head -c 200000000 /dev/zero; } | gzip -1 > a.gz");
+    rusage before{}, after{};
+    getrusage(RUSAGE_SELF, &before);
+    EXPECT_EQ(Fn::readImage(workshop.path("a.gz")).toMono8()(0, 0), 'x');
+    getrusage(RUSAGE_SELF, &after);
+    EXPECT_LT(after.ru_maxrss - before.ru_maxrss, 32 * 1024) << "KB";
+
+    // One that is held as a whole is held in proportion to the file.
+    workshop.write("a.tif", "II*");
+    workshop.run("{ cat a.tif; head -c 200000000 /dev/zero; } | gzip -9 > tiff.gz");
+    EXPECT_EQ(thrownBy([&] { Fn::readImage(workshop.path("tiff.gz")); }),
+              "FNEBadFormat: gunzip: " + workshop.path("tiff.gz") + " exceeds the limit of " +
+                  std::to_string((1u << 26) + 64 * std::filesystem::file_size(workshop.path("tiff.gz"))) +
+                  " bytes for decoding");
+
+    // What is wrong with the gzip file tells more than what a reader makes of it.
+    const std::string whole = bytesOfFile(fixture("gzip/gray1.png.gz"));
+    workshop.write("cut.gz", whole.substr(0, whole.size() - 40));
+    EXPECT_EQ(thrownBy([&] { Fn::readImage(workshop.path("cut.gz")); }),
+              "FNEIOError: gunzip: error in gzread() with " + workshop.path("cut.gz"));
+    Fn::ImageLimits few;
+    few.maxBytes = 10;
+    EXPECT_EQ(thrownBy([&] { Fn::readImage(fixture("gzip/gray1.png.gz"), {}, few); }),
+              "FNEBadFormat: gunzip: " + fixture("gzip/gray1.png.gz") +
+                  " exceeds the limit of 10 bytes for decoding");
 }
 
 TEST(HostileFiles, AGzipBombStopsAtTheLimit) {

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "fn/image_reference.h"
+#include "fn/imagefile/image_limits.h"
 #include "fn/imagefile/properties_feedback.h"
 #include "support/scratch_folder.h"
 
@@ -26,9 +27,9 @@ private:
 std::string bytesOfFile(const std::filesystem::path& path);
 
 /// The files below tests/fn/imagefile/fixtures, or one folder of it. Those whose names begin with "refused"
-/// are of a kind that the readers do not accept.
+/// are of a kind that the readers do not accept, unless they take rare variants.
 std::vector<std::filesystem::path> fixtures(const std::string& folder = {});
-bool isRefused(const std::filesystem::path& fixture);
+bool isRefused(const std::filesystem::path& fixture, const Fn::ImageLimits& limits = {});
 std::string fixture(const std::string& name);
 
 /// Test pictures of 13 x 9 pixels: smooth colours and grays; grays of 1, 2 or 4 bits stretched to 8; and 16

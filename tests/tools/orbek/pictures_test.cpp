@@ -7,7 +7,10 @@
 
 #include <gtest/gtest.h>
 
+#include <cstdlib>
 #include <sstream>
+
+#include <sys/stat.h>
 
 using namespace Orbek;
 using namespace Orbek::Tool;
@@ -28,7 +31,8 @@ std::string tiff(bool littleEndian, unsigned int tag, unsigned int type, unsigne
 }
 
 Orientation orientationOf(const std::string& bytes) {
-    return orientationInTiff({reinterpret_cast<const unsigned char*>(bytes.data()), bytes.size()});
+    std::istringstream stream(bytes);
+    return orientationIn(stream);
 }
 
 /// A JPEG file whose Exif block tells an orientation, behind a comment.
@@ -49,6 +53,32 @@ TEST(Exif, TellsTheOrientationInBothByteOrders) {
     const std::string whole = tiff(true, 274, 3, 6);
     for (std::size_t size = 0; size < whole.size() - 2; ++size)
         EXPECT_EQ(orientationOf(whole.substr(0, size)), Orientation::Upright) << size;
+    // A BigTIFF file with an entry to step over.
+    const std::string big("MM\0\x2B\0\x08\0\0\0\0\0\0\0\0\0\x10\0\0\0\0\0\0\0\2"
+                          "\1\1\0\3\0\0\0\0\0\0\0\1\0\1\0\0\0\0\0\0"
+                          "\1\x12\0\3\0\0\0\0\0\0\0\1\0\3\0\0\0\0\0\0",
+                          64);
+    EXPECT_EQ(orientationOf(big), Orientation::HalfTurned);
+}
+
+TEST(Exif, IsFoundInPngFiles) {
+    const auto chunk = [](const std::string& kind, const std::string& content) {
+        const auto size = static_cast<char>(content.size());
+        return std::string(3, '\0') + size + kind + content + "crc.";
+    };
+    const std::string start = "\x89PNG\r\n\x1A\n" + chunk("IHDR", std::string(13, 'x')),
+                      block = tiff(true, 274, 3, 8), end = chunk("IEND", "");
+    EXPECT_EQ(orientationOf(start + chunk("eXIf", block) + end), Orientation::TurnCounterClockwise);
+    EXPECT_EQ(orientationOf(start + chunk("IDAT", "data") + chunk("eXIf", block)),
+              Orientation::TurnCounterClockwise);
+    for (const std::string& bytes :
+         {start, start + end + chunk("eXIf", block), start + "\xFF\xFF\xFF\xFFIDAT",
+          start +
+              "\x7F\xFF\xFF\xFF"
+              "eXIf" +
+              block,
+          start + chunk("eXIf", "II")})
+        EXPECT_EQ(orientationOf(bytes), Orientation::Upright);
 }
 
 TEST(Pictures, AreReadUpright) {
@@ -83,9 +113,46 @@ TEST(Pictures, AreReadUpright) {
     }
 }
 
+TEST(Pictures, TiffFilesAndGzipContentAreTurnedToo) {
+    if (std::system("tiffset >/dev/null 2>&1; test $? -ne 127 && command -v convert >/dev/null") != 0)
+        GTEST_SKIP() << "ImageMagick or libtiff's tools are not installed";
+    const ScratchFolder scratch;
+    const std::string in = "cd '" + scratch.path().string() + "' && ";
+    scratch.write("a.pgm", "P5 2 1 255\nAB");
+    ASSERT_EQ(std::system((in + "convert a.pgm a.tif && tiffset -s 274 6 a.tif").c_str()), 0);
+    const FNImage<unsigned char> turnedImage = readUpright(scratch.file("a.tif")).toMono8();
+    EXPECT_EQ(turnedImage.w(), 1u);
+    EXPECT_EQ(turnedImage(0, 0), 'A') << "left is up after a turn clockwise";
+    std::ostringstream jpeg;
+    FNImage<unsigned char> wide(32, 16);
+    wide.fill(9);
+    Fn::writeJpeg(FNImageReferenceFactory::create(wide), jpeg, 100);
+    scratch.write("a.jpg", withExif(jpeg.str(), 6));
+    ASSERT_EQ(std::system((in + "gzip a.jpg").c_str()), 0);
+    EXPECT_EQ(readUpright(scratch.file("a.jpg.gz")).w(), 16u);
+}
+
+TEST(Pictures, FilesThatAreInputsAreNotWrittenOver) {
+    const ScratchFolder scratch;
+    const std::string a = scratch.write("a.jpg", "photo"), folder = scratch.path().string();
+    EXPECT_THROW(PictureFolder(folder, {a}), std::runtime_error);
+    // The file by another name, and a link to it that has the name of the result.
+    std::filesystem::create_directory_symlink(folder, scratch.file("again"));
+    EXPECT_THROW(PictureFolder(scratch.file("again"), {a}), std::runtime_error);
+    std::filesystem::create_directory(scratch.file("out"));
+    std::filesystem::create_symlink("../a.jpg", scratch.file("out/a.jpg"));
+    EXPECT_EQ(thrownBy([&] { PictureFolder(scratch.file("out"), {a}); }),
+              "std::exception: " + scratch.file("out/a.jpg") + ": is an input too, and is not written over");
+    EXPECT_NO_THROW(PictureFolder(scratch.file("other"), {a}));
+    EXPECT_NO_THROW(PictureFolder(folder, {scratch.write("b.png", "photo")}));
+}
+
 TEST(Pictures, FoldersAreReplacedByTheirImagesInOrder) {
     const ScratchFolder scratch;
-    for (const char* name : {"f10.png", "f9.PNG", "f9b.jpg", "notes.txt"}) scratch.write(name, "");
+    for (const char* name : {"f10.png", "f9.PNG", "f9b.jpg", "notes.txt", ".hidden.jpg"})
+        scratch.write(name, "");
+    ASSERT_EQ(mkfifo(scratch.file("pipe.jpg").c_str(), 0600), 0);
+    std::filesystem::create_directory(scratch.file("folder.jpg"));
     const auto files = pictureFiles({"a.txt", scratch.path().string()});
     ASSERT_EQ(files.size(), 4u);
     EXPECT_EQ(files[0], "a.txt");

@@ -46,6 +46,63 @@ TEST(OrbekToolWithModels, FindGoesOnBehindFilesThatCannotBeRead) {
               a + ": width 120, height 90, 0 faces\n" + b + ": width 1, height 1, 0 faces\n");
 }
 
+TEST(OrbekToolWithModels, ReadsPicturesFromPipes) {
+    const ScratchFolder scratch;
+    const std::string a = writeRamp(scratch, "a.pgm", 120, 90);
+    const std::string orbek = "'" ORBEK_BINARY_DIR "/bin/orbek'";
+    for (const std::string name : {"-", "/dev/stdin"}) {
+        // Twice: what comes out of a pipe is kept.
+        const std::string command =
+            "cat '" + a + "' | " + orbek + " find " + name + " " + name + " >'" + scratch.file("out") + "'";
+        EXPECT_EQ(std::system(command.c_str()), 0);
+        const std::string line = name + ": width 120, height 90, 0 faces\n";
+        EXPECT_EQ(scratch.read("out"), line + line);
+    }
+}
+
+TEST(OrbekToolWithModels, NeverWritesOverItsInputs) {
+    const ScratchFolder scratch;
+    std::ostringstream jpeg;
+    FNImage<unsigned char> black(64, 64);
+    black.fill(0);
+    Fn::writeJpeg(FNImageReferenceFactory::create(black), jpeg, 50);
+    const std::string photo = scratch.write("a.jpg", jpeg.str()), folder = scratch.path().string();
+    for (const Lines& arguments : std::vector<Lines>{{"find", folder, "--draw", folder},
+                                                     {"track", folder, "--draw", folder},
+                                                     {"token", folder, "-o", folder},
+                                                     {"frontal", photo, "-o", photo},
+                                                     {"record", "write", photo, "--uncut", "-o", photo},
+                                                     {"portrait", photo, "--report", photo},
+                                                     {"enrol", photo, "-o", photo}}) {
+        const ProgramRun run = runOrbek(arguments);
+        EXPECT_EQ(run.status, arguments[0] == "portrait" ? 2 : 1) << arguments[0];
+        EXPECT_EQ(run.complaints, "orbek: " + photo + ": is an input too, and is not written over\n");
+        EXPECT_EQ(scratch.read("a.jpg"), jpeg.str()) << arguments[0];
+    }
+    // Nor is what was there lost if a result cannot be written.
+    fs::create_directory(scratch.file("out"));
+    scratch.write("out/a.jpg", "old");
+    const std::string command = "ulimit -f 1; trap '' XFSZ; '" ORBEK_BINARY_DIR "/bin/orbek' find '" + photo +
+                                "' --draw '" + scratch.file("out") + "' 2>'" + scratch.file("err") + "'";
+    scratch.write("a.jpg", "P6 200 200 255\n" + std::string(120000, 'x'));
+    EXPECT_NE(std::system(command.c_str()), 0);
+    EXPECT_NE(scratch.read("err").find(scratch.file("out/a.jpg") + ": cannot be written"), std::string::npos)
+        << scratch.read("err");
+    EXPECT_EQ(scratch.read("out/a.jpg"), "old");
+    EXPECT_EQ(std::distance(fs::directory_iterator(scratch.file("out")), fs::directory_iterator()), 1);
+}
+
+TEST(OrbekToolWithModels, TheLimitsOfPicturesCanBeRaised) {
+    const ScratchFolder scratch;
+    const std::string file = scratch.write("a.pgm", "P5 70000 1 255\n" + std::string(70000, 'x'));
+    const ProgramRun refused = runOrbek({"find", file});
+    EXPECT_EQ(refused.status, 2);
+    EXPECT_NE(refused.complaints.find("exceeds the limit of 65535 columns"), std::string::npos);
+    EXPECT_EQ(runOrbek({"find", file, "--max-side", "70000"}).status, 0);
+    EXPECT_EQ(runOrbek({"find", file, "--max-side", "70000", "--max-pixels", "69999"}).status, 2);
+    EXPECT_EQ(runOrbek({"find", file, "--max-side", "0"}).status, 1);
+}
+
 TEST(OrbekToolWithModels, SaysWhatStopsIt) {
     const ScratchFolder scratch;
     const std::string a = writeRamp(scratch, "a.pgm", 20, 20),
