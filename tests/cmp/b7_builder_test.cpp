@@ -83,6 +83,12 @@ TEST_F(B7Builder, MakesRecordsOfTheFeaturesOfItsSamples) {
               "FNEBadArg: CmpAlgorithm::reconstructSample: not implemented");
 }
 
+TEST_F(B7Builder, TakesKnownEyesWithoutMouthAndBridge) {
+    Found eyes = everything();
+    eyes.mouth.confidence = eyes.bridge.confidence = 0;
+    EXPECT_EQ(algorithm(quiet, eyes)->createRecordBuilder()->pushSample(sample(1)), 0);
+}
+
 TEST_F(B7Builder, RefusesRecordsThatAreNotItsOwn) {
     const Algorithm made = algorithm("", everything()), other = algorithm("X.FIRVersion = 10\n");
     const RecordBuilder builder = made->createRecordBuilder();
