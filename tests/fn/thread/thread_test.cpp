@@ -1,6 +1,7 @@
 #include "fn/thread/async.h"
 #include "fn/thread/condition_variable.h"
 #include "fn/thread/resource.h"
+#include "fn/thread/thread_impl.h"
 #include "support/recorded_dialog.h"
 #include "support/thrown.h"
 
@@ -135,6 +136,26 @@ TEST(Thread, StopsAtEachKindOfCancellationPoint) {
     }
 }
 
+TEST(Thread, AnEventThatHasASignalIsNoCancellationPoint) {
+    std::string passed;
+    const FNThread thread = FNSpawn(
+        [&] {
+            while (!cancelArrived()) std::this_thread::sleep_for(std::chrono::milliseconds(1));
+            const FNEvent event;
+            event.signal();
+            event.wait();
+            passed += "signalled ";
+            event.wait();
+            passed += "unsignalled";
+        },
+        "signalled");
+    thread.start();
+    thread.requestCancel();
+    thread.join();
+    EXPECT_EQ(passed, "signalled ");
+    EXPECT_EQ(thread.state().message, "Cancelled.");
+}
+
 TEST(Thread, CancellationWaitsWhileItIsDisabled) {
     const FNEvent inside, go;
     std::atomic<bool> passed = false;
@@ -173,6 +194,42 @@ TEST(Thread, TerminateStopsWhatNeverReachesACancellationPoint) {
     thread.start();
     thread.terminate();
     EXPECT_EQ(thread.state().state, FNThreadState::ended);
+}
+
+TEST(Thread, TerminateWaitsForTheEnd) {
+#ifdef __SANITIZE_ADDRESS__
+    GTEST_SKIP() << "the address sanitizer cannot follow the unwinding of a cancelled thread";
+#endif
+    std::atomic<bool> inside = false, gone = false;
+    const FNThread thread = FNSpawn(
+        [&] {
+            const struct Slow {
+                std::atomic<bool>& gone;
+                ~Slow() {
+                    std::this_thread::sleep_for(std::chrono::milliseconds(30));
+                    gone = true;
+                }
+            } slow{gone};
+            inside = true;
+            for (;;) pthread_testcancel();
+        },
+        "slow to go");
+    thread.start();
+    ASSERT_TRUE(eventually([&] { return inside.load(); }));
+    std::vector<int> states;
+    thread.addObserver([&](const FNThreadState& state) { states.push_back(state.state); });
+    thread.terminate();
+    EXPECT_TRUE(gone);
+    EXPECT_EQ(thread.state().message, "Cancelled.");
+    EXPECT_EQ(states, std::vector<int>{FNThreadState::ended});
+}
+
+TEST(ThreadManager, NamesWhatIsStillReferenced) {
+    const RecordedDialog dialog;
+    const FNThread idle = FNSpawn([] {}, "idle one");
+    FNThreadManager().reportLeft();
+    EXPECT_EQ(dialog.messages(),
+              std::vector<std::string>{"warn: FNThreadManager: thread idle one is still referenced"});
 }
 
 TEST(Thread, MayOutliveItsHandles) {
@@ -446,6 +503,33 @@ TEST(AsyncRepeater, RepeatsUntilStopped) {
     repeater.setDelay(60000);
     repeater.start();
     ASSERT_TRUE(eventually([&] { return runs > stopped; }));
+}
+
+TEST(AsyncRepeater, WaitsBetweenItsRuns) {
+    std::atomic<int> runs = 0;
+    Fn::AsyncRepeater repeater([&] { ++runs; }, 60000, {});
+    repeater.start();
+    ASSERT_TRUE(eventually([&] { return runs == 1; }));
+    std::this_thread::sleep_for(std::chrono::milliseconds(30));
+    EXPECT_EQ(runs, 1);
+    repeater.setDelay(-5); // none
+    repeater.stop();
+    repeater.start();
+    EXPECT_TRUE(eventually([&] { return runs > 5; }));
+}
+
+TEST(AsyncFunctor, RunsEachJobAtOnce) {
+    std::atomic<int> inside = 0, errors = 0;
+    Fn::AsyncFunctor run;
+    for (int i = 0; i < 3; ++i)
+        run(
+            [&] {
+                ++inside;
+                eventually([&] { return inside == 3; }); // none waits for another
+                FN_THROW(FNEGeneric, "end");
+            },
+            [&](const std::exception&) { ++errors; }, "job");
+    EXPECT_TRUE(eventually([&] { return errors == 3; }));
 }
 
 TEST(AsyncFunctor, JoinsItsJobsAtTheEnd) {

@@ -45,6 +45,26 @@ TEST(PortraitToolWithModels, TellsEveryValueWithItsLimits) {
     EXPECT_EQ(portrait["compliant"], all);
 }
 
+TEST(PortraitToolWithModels, TellsOfTheSamplePeopleWhatIsDrawn) {
+    const std::pair<const char*, const char*> people[] = {
+        {"alice", "female white"}, {"bob", "male white"},    {"carl", "male black"},
+        {"david", "male asian"},   {"erik", "male white"},   {"fiona", "female white"},
+        {"grace", "female black"}, {"hanna", "female white"}};
+    for (const auto& [person, drawn] : people)
+        for (const char number : {'1', '2', '3', '4'}) {
+            const std::string name = std::string(person) + number;
+            const json portrait = runOrbek({"portrait", "--json", picture(name)}).lines().at(0);
+            const json& features = portrait["features"];
+            EXPECT_EQ(portrait["faces"], 1) << name;
+            EXPECT_EQ(features["gender"].get<std::string>() + " " + features["ethnicity"].get<std::string>(),
+                      drawn)
+                << name;
+            EXPECT_EQ(features["glasses"], false) << name;
+            EXPECT_GT(features["age"], 14) << name;
+            EXPECT_LT(features["age"], 60) << name;
+        }
+}
+
 TEST(PortraitToolWithModels, ItsStatusIsThatOfAllPictures) {
     const ScratchFolder scratch;
     // Limits that everything passes, and the tests that have none.
