@@ -1,5 +1,6 @@
 #include "orbek/population.h"
 
+#include "fn/whole_file.h"
 #include "orbek/implementation/comparison.h"
 #include "orbek/implementation/population_file.h"
 
@@ -7,8 +8,6 @@
 #include <cstring>
 #include <fstream>
 #include <limits>
-
-#include <unistd.h>
 
 namespace Orbek {
 
@@ -50,18 +49,7 @@ void Population::save(std::ostream& stream) const {
 }
 
 void Population::save(const std::string& fileName) const {
-    const std::string beside = fileName + "-" + std::to_string(getpid()) + ".tmp";
-    try {
-        std::ofstream file(beside, std::ios::binary | std::ios::trunc);
-        if (!file) FN_THROW(FNEIOError, std::string("cannot be opened for writing: ") + std::strerror(errno));
-        save(file);
-        if (!file.flush()) FN_THROW(FNEIOError, std::string("cannot be written: ") + std::strerror(errno));
-        if (std::rename(beside.c_str(), fileName.c_str()) != 0)
-            FN_THROW(FNEIOError, std::string("cannot be written: ") + std::strerror(errno));
-    } catch (const std::exception& e) {
-        unlink(beside.c_str());
-        FN_THROW(FNEIOError, fileName + ": " + e.what());
-    }
+    Fn::writeWholeFile(fileName, [&](std::ostream& stream) { save(stream); });
 }
 
 Population Population::load(const Configuration& configuration, std::istream& stream) {
