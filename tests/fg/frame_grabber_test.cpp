@@ -195,9 +195,9 @@ FG::DllFrameGrabberFactoryCache plugins(const std::string& text = {}) {
     return FG::DllFrameGrabberFactoryCache(componentOf<FG::DllFrameGrabberFactoryCacheDef>(text));
 }
 
-FG::GrabberPair create(const std::string& text) {
+FG::GrabberPair create(const std::string& text, std::string* reason = nullptr) {
     return FG::FrameGrabberFactory<FG::FrameGrabberFullSet>::create2(
-        componentOf<FG::FrameGrabberFactoryDef>(text), "front", plugins());
+        componentOf<FG::FrameGrabberFactoryDef>(text), "front", plugins(), reason);
 }
 
 TEST(FrameGrabberFactory, MakesFilesAndLeavesOtherKindsEmpty) {
@@ -210,7 +210,9 @@ TEST(FrameGrabberFactory, MakesFilesAndLeavesOtherKindsEmpty) {
     EXPECT_EQ(made.second->id(), "front");
     EXPECT_FALSE(create("X = Prosilica\n").first);
     EXPECT_TRUE(dialog.messages().empty());
-    EXPECT_FALSE(create("X = ImageFiles\nX.ImageFiles.CaptureFrameRate = 0\n").first);
+    std::string reason;
+    EXPECT_FALSE(create("X = ImageFiles\nX.ImageFiles.CaptureFrameRate = 0\n", &reason).first);
+    EXPECT_EQ(reason, "CaptureFrameRate must be bigger than zero");
     EXPECT_EQ(dialog.messages(),
               std::vector<std::string>{"error: Could not initialize video capture device front: "
                                        "CaptureFrameRate must be bigger than zero"});
