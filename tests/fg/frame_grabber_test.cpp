@@ -106,6 +106,9 @@ TEST(MultiFile, DeliversNoFasterThanItsRate) {
 }
 
 TEST(MultiFile, SettingsHaveTheirDefaults) {
+    EXPECT_FALSE(type<FG::MultiFileDef>().hasValue());
+    EXPECT_FALSE(type<FG::DllFrameGrabberFactoryCacheDef>().hasValue());
+    EXPECT_FALSE(type<FG::SupportedFrameGrabberDefs>().hasValue());
     const Component settings = componentOf<FG::MultiFileDef>("");
     for (const auto& [key, value] : {std::pair{"FileLocation", "Directory"},
                                      {"ImageCaching", "true"},
@@ -270,6 +273,53 @@ TEST(DllFrameGrabberFactory, ALibraryStaysAsLongAsAnythingFromIt) {
     pixels.getExclusive()[0] = 1;
     EXPECT_EQ(pixels(1, 0), 77);
     EXPECT_FALSE(isLoaded(FG_PLUGIN_whole)) << "the pixels are a copy now";
+}
+
+TEST(DllFrameGrabberFactory, EveryOperationReachesTheCamera) {
+    using Range = Fn::LiveVideoSource::Range;
+    const Component settings = componentOf<FG::DllFrameGrabberFactoryCacheDef>("");
+    const FG::GrabberPair pair = FG::DllFrameGrabberFactory(FG_PLUGIN_whole).createFG2(settings, "north");
+    Fn::LiveVideoSource& camera = *pair.first;
+    FG::StillImageSource& still = *pair.second;
+    EXPECT_EQ(camera.name(), "north");
+    EXPECT_EQ(still.id(), "north");
+    EXPECT_EQ(still.name(), "north");
+    EXPECT_EQ(camera.contrast(), 11u);
+    EXPECT_EQ(camera.exposure(), 21u);
+    EXPECT_EQ(camera.saturation(), 31u);
+    EXPECT_EQ(camera.hue(), 41u);
+    EXPECT_EQ(camera.contrastRange(), (Range{12, 13}));
+    EXPECT_EQ(camera.exposureRange(), (Range{22, 23}));
+    EXPECT_EQ(camera.saturationRange(), (Range{32, 33}));
+    EXPECT_EQ(camera.hueRange(), (Range{42, 43}));
+    camera.setSaturation(34);
+    EXPECT_EQ(camera.saturation(), 34u);
+    EXPECT_EQ(thrownBy([&] { camera.setHue(1); }), "std::exception: no hue");
+    still.setExposure(24);
+    EXPECT_EQ(camera.exposure(), 24u);
+    camera.setExposure(25);
+    EXPECT_EQ(still.exposure(), 25u);
+    EXPECT_EQ(still.exposureRange(), (Range{22, 23}));
+    still.setGain(7);
+    EXPECT_EQ(camera.gain(), 7u);
+    EXPECT_EQ(still.gainRange(), (Range{1, 255}));
+    camera.setVideoFormat(Fn::Package(99));
+    EXPECT_EQ(camera.gain(), 99u);
+    EXPECT_EQ(camera.configure(), 51);
+    EXPECT_EQ(camera.videoFormat(), 52);
+    EXPECT_EQ(camera.w(), 4u);
+    EXPECT_EQ(camera.h(), 3u);
+
+    const FNImageReference image = camera.get();
+    EXPECT_EQ(image.w() * 10 + image.h(), 43u);
+    EXPECT_FALSE(image.isColor());
+    EXPECT_EQ(image.native(), FNImageReference::MONO8);
+    EXPECT_EQ(image.toMono16()(0, 0), 99 * 256 + 128);
+    EXPECT_EQ(image.toMonoFloat()(0, 0), 99 / 256.0f + 1 / 512.0f);
+    EXPECT_EQ(image.toBgra32()(0, 0), Fn::Bgra32(99, 99, 99));
+    EXPECT_EQ(image.toRgb48()(0, 0).g, 99 * 256 + 128);
+    image.setSerializationStrategy(FNImageReference::COMPRESSED_PNG);
+    EXPECT_EQ(image.getSerializationStrategy(), FNImageReference::COMPRESSED_PNG);
 }
 
 TEST(DllFrameGrabberFactory, RefusesLibrariesThatLackFunctions) {
