@@ -161,6 +161,19 @@ TEST(MultiFile, RefusesSettingsWithoutSense) {
     FG::MultiFile grabber = multiFile(files.listed());
     EXPECT_EQ(thrownBy([&] { grabber.setGain(1); }).substr(0, 15), "FNEBadFunCall: ");
     EXPECT_EQ(thrownBy([&] { grabber.setHue(1); }).substr(0, 15), "FNEBadFunCall: ");
+    EXPECT_EQ(thrownBy([&] { grabber.setContrast(1); }),
+              "FNEBadFunCall: MultiFile: files have no contrast to set");
+    const auto still = grabber.stillImageSource();
+    EXPECT_EQ(thrownBy([&] { still->setGain(1); }), "FNEBadFunCall: MultiFile: files have no gain to set");
+    EXPECT_EQ(thrownBy([&] { still->setExposure(1); }),
+              "FNEBadFunCall: MultiFile: files have no exposure to set");
+    for (const unsigned int value : {grabber.gain(), grabber.contrast(), grabber.exposure(),
+                                     grabber.saturation(), grabber.hue(), still->gain(), still->exposure()})
+        EXPECT_EQ(value, 0u);
+    const Fn::LiveVideoSource::Range noRange{};
+    for (const auto& range : {grabber.gainRange(), grabber.contrastRange(), grabber.exposureRange(),
+                              still->gainRange(), still->exposureRange()})
+        EXPECT_EQ(range, noRange);
 }
 
 TEST(MultiFile, AFileThatCannotBeReadIsTriedAgain) {
