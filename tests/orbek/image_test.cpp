@@ -87,10 +87,7 @@ TEST(ImageIO, WhatWasSavedIsLoadedUnderItsName) {
                           png = scratch.file("a.png"), jpeg = scratch.file("a.jpg");
         Bmp::save(image, bmp);
         Pgm::save(image, pnm);
-        {
-            std::ofstream file(png, std::ios::binary);
-            Png::save(image, file, 6);
-        }
+        Png::save(image, png, 6);
         Jpeg::save(image, jpeg, 100);
         auto bmpStream = stream("a.bmp"), pngStream = stream("a.png"), anyStream = stream("a.png"),
              jpegStream = stream("a.jpg");
@@ -155,6 +152,48 @@ TEST(ImageIO, FeedbackTellsHowThePixelsAreStored) {
     std::string record;
     Png::load(stream, ImageIO::PropertiesFeedback(new Recorder(record)));
     EXPECT_EQ(record, "mode 2 depth 32");
+}
+
+TEST(ImageIO, LimitsHoldForTheProcess) {
+    const ImageIO::Limits before = ImageIO::limits();
+    EXPECT_EQ(before.maxWidth, 65535u);
+    EXPECT_EQ(before.maxHeight, 65535u);
+    EXPECT_EQ(before.maxPixels, 134217728u);
+    EXPECT_EQ(before.maxBytes, 1073741824u);
+    const std::string file = "P5 4 3 255\n" + std::string(12, 'x');
+    const auto load = [&](const ImageIO::Limits& limits) {
+        return thrownBy([&] {
+                   ImageIO::setLimits(limits);
+                   std::istringstream stream(file);
+                   ImageIO::load(stream);
+               })
+            .substr(0, 12);
+    };
+    EXPECT_EQ(load({4, 3, 12, 12}), "nothing thro");
+    for (const ImageIO::Limits& limits :
+         std::vector<ImageIO::Limits>{{3, 3, 12, 12}, {4, 2, 12, 12}, {4, 3, 11, 12}, {4, 3, 12, 11}})
+        EXPECT_EQ(load(limits), "FNEBadFormat");
+    const ImageIO::Limits largest{0x7FFFFFFF, 0x7FFFFFFF, ~std::uint64_t{0}, ~std::uint64_t{0}};
+    EXPECT_EQ(load(largest), "nothing thro");
+    for (const ImageIO::Limits& limits : std::vector<ImageIO::Limits>{{0, 3, 12, 12},
+                                                                      {4, 0, 12, 12},
+                                                                      {4, 3, 0, 12},
+                                                                      {4, 3, 12, 0},
+                                                                      {0x80000000, 3, 12, 12},
+                                                                      {4, 0x80000000, 12, 12}})
+        EXPECT_EQ(load(limits), "FNEBadArg: I");
+    EXPECT_EQ(ImageIO::limits().maxPixels, ~std::uint64_t{0}) << "wrong ones change nothing";
+    ImageIO::setLimits(before);
+}
+
+TEST(ImageIO, RareVariantsAreRead) {
+    std::istringstream bitmap("P1 2 1 10"), plain("P3 1 1 255 1 2 3");
+    const Image black = ImageIO::load(bitmap), color = ImageIO::load(plain);
+    EXPECT_FALSE(black->isColor());
+    EXPECT_EQ(black->grayScaleRepresentation()[0], 0);
+    EXPECT_EQ(black->grayScaleRepresentation()[1], 255);
+    EXPECT_TRUE(color->isColor());
+    EXPECT_EQ(color->colorRepresentation()[0].green, 2);
 }
 
 TEST(RotateImage, TurnsPixelsAndKeepsTheKind) {

@@ -219,8 +219,10 @@ private:
     FNImage<T> decodeAs(const Fn::ImageLimits& limits, int components, const char* refusal) {
         limits.check(info_.image_width, info_.image_height, sizeof(T), "Fn::readJpeg");
         // What remains is for the coefficients, which a file of several scans makes libjpeg keep.
-        info_.mem->max_memory_to_use = static_cast<long>(
-            limits.maxBytes - std::uint64_t{info_.image_width} * info_.image_height * sizeof(T));
+        const Fn::ImageLimits left =
+            limits.beside(std::uint64_t{info_.image_width} * info_.image_height * sizeof(T));
+        info_.mem->max_memory_to_use =
+            static_cast<long>(std::clamp<std::uint64_t>(left.maxBytes, 1, std::numeric_limits<long>::max()));
         guarded([this] { jpeg_start_decompress(&info_); });
         if (info_.output_components != components) FN_THROW(FNEBadArg, refusal);
 

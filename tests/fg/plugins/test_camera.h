@@ -3,6 +3,7 @@
 #include "fg/dll_frame_grabber_factory.h"
 
 #include <cstdlib>
+#include <stdexcept>
 
 #define FG_PLUGIN_EXPORT extern "C" __attribute__((visibility("default")))
 
@@ -25,16 +26,30 @@ public:
         if (value > 255) FN_THROW(FNEOutOfRange, "gain of the test camera");
         gain_ = value;
     }
-    unsigned int contrast() override { return 0; }
-    Range contrastRange() override { return {}; }
+    unsigned int contrast() override { return 11; }
+    Range contrastRange() override { return {12, 13}; }
     void setContrast(unsigned int) override { throw 7; }
+    unsigned int exposure() override { return exposure_; }
+    Range exposureRange() override { return {22, 23}; }
+    void setExposure(unsigned int value) override { exposure_ = value; }
+    unsigned int saturation() override { return saturation_; }
+    Range saturationRange() override { return {32, 33}; }
+    void setSaturation(unsigned int value) override { saturation_ = value; }
+    unsigned int hue() override { return 41; }
+    Range hueRange() override { return {42, 43}; }
+    void setHue(unsigned int) override { throw std::invalid_argument("no hue"); }
+    int configure() override { return 51; }
+    int videoFormat() override { return 52; }
+    void setVideoFormat(const Fn::Package& format) override {
+        gain_ = static_cast<unsigned int>(format.toInt32());
+    }
     unsigned int w() override { return 4; }
     unsigned int h() override { return 3; }
     Fn::Package getVideoFormat() override { return Fn::Package(12); }
 
 private:
     std::string name_;
-    unsigned int gain_ = 1;
+    unsigned int gain_ = 1, exposure_ = 21, saturation_ = 31;
 };
 
 using CameraHandle = FNCountedPtr<Fn::LiveVideoSource>;

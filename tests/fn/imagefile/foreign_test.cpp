@@ -3,6 +3,8 @@
 #include "fn/imagefile/bmp.h"
 #include "fn/imagefile/image_file.h"
 #include "fn/imagefile/j2k.h"
+#include "fn/imagefile/jpeg.h"
+#include "fn/imagefile/png.h"
 #include "fn/imagefile/tiff.h"
 #include "support/thrown.h"
 #include "workshop.h"
@@ -10,6 +12,7 @@
 #include <gtest/gtest.h>
 
 #include <fstream>
+#include <sstream>
 
 namespace {
 
@@ -365,6 +368,20 @@ TEST_F(ForeignFiles, OtherProgramsReadOurFiles) {
         workshop.run("convert " + name + " back.ppm");
         EXPECT_EQ(largestDifference(Fn::readImage(workshop.path("back.ppm")), name[0] == 'c' ? color : gray),
                   0);
+    }
+    for (const FNImageReference& image : {color, gray, wide, wideColor}) {
+        std::ostringstream png;
+        Fn::writePng(image, png, 6);
+        workshop.write("a.png", png.str());
+        workshop.run("convert a.png back.ppm");
+        EXPECT_EQ(Fn::readImage(workshop.path("back.ppm")).toRgb48(), image.toRgb48());
+        Fn::saveJpeg(image, workshop.path("a.jpg"), FNImageCompressor::BEST_QUALITY);
+        workshop.run("convert a.jpg back.ppm");
+        EXPECT_EQ(largestDifference(Fn::readImage(workshop.path("back.ppm")),
+                                    Fn::readImage(workshop.path("a.jpg"))),
+                  0);
+        EXPECT_LE(largestDifference(Fn::readImage(workshop.path("back.ppm")), image),
+                  image.isColor() ? 60 : 3);
     }
     if (!Workshop::has("opj_decompress")) GTEST_SKIP() << "opj_decompress is not installed";
     for (const std::string& format : Fn::j2kFormats()) {

@@ -112,7 +112,7 @@ TEST(ReadImage, WorksOnAStreamThatCannotSeek) {
         Pipe pipe(bytesOfFile(fixture(name)));
         std::istream stream(&pipe);
         EXPECT_EQ(largestDifference(Fn::readImage(stream), Fn::readImage(fixture(name))), 0) << name;
-        EXPECT_FALSE(stream.fail()) << name;
+        EXPECT_TRUE(!stream.fail() || stream.eof()) << name;
     }
 }
 

@@ -73,6 +73,10 @@ TEST(HostileFiles, LimitsHoldForEveryFormat) {
         exact.maxHeight = image.h();
         exact.maxPixels = std::uint64_t{image.w()} * image.h();
         EXPECT_NO_THROW(readFixture(path, bytes, exact)) << path;
+        Fn::ImageLimits none = exact;
+        none.maxWidth = none.maxHeight = 0x7FFFFFFF;
+        none.maxPixels = none.maxBytes = ~std::uint64_t{0};
+        EXPECT_NO_THROW(readFixture(path, bytes, none)) << path;
         Fn::ImageLimits narrow = exact, low = exact, few = exact, small = exact;
         --narrow.maxWidth;
         --low.maxHeight;
