@@ -7,7 +7,9 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <chrono>
+#include <fstream>
 #include <thread>
 
 #include <poll.h>
@@ -254,6 +256,20 @@ TEST(Thread, ForeignThreadsKnowThemselves) {
         EXPECT_NE(FNThreadSelf::state().name, "MainThread");
         FNThreadSelf::sleep(1);
     }).join();
+}
+
+TEST(Thread, LeavesNoStackBehind) {
+    const auto mappings = [] {
+        std::ifstream maps("/proc/self/maps");
+        return std::count(std::istreambuf_iterator<char>(maps), {}, '\n');
+    };
+    const auto before = mappings();
+    for (int i = 0; i < 400; ++i) { // that nobody joins
+        const FNThread thread = FNSpawn([] {});
+        if (i % 2) thread.start();
+    }
+    // Some stacks are kept for later threads. Each has a mapping, and one more for its guard.
+    EXPECT_TRUE(eventually([&] { return mappings() < before + 200; }));
 }
 
 TEST(Event, NoSignalIsLost) {
