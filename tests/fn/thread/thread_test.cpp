@@ -230,8 +230,10 @@ TEST(ThreadManager, NamesWhatIsStillReferenced) {
     const RecordedDialog dialog;
     const FNThread idle = FNSpawn([] {}, "idle one");
     FNThreadManager().reportLeft();
-    EXPECT_EQ(dialog.messages(),
-              std::vector<std::string>{"warn: FNThreadManager: thread idle one is still referenced"});
+    EXPECT_EQ(
+        std::ranges::count(dialog.messages(), "warn: FNThreadManager: thread idle one is still referenced"),
+        1)
+        << "others may still be about to end";
 }
 
 TEST(Thread, MayOutliveItsHandles) {
