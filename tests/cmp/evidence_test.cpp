@@ -233,6 +233,10 @@ TEST(Evidence, OneFaultyThumbnailIsAWarningAndTheNextFrameServes) {
     EXPECT_EQ(Cmp::getImageDataFromSerializedEvidence(stripped),
               Cmp::getImageDataFromSerializedEvidence(package));
     EXPECT_TRUE(Evidence(stripped).serialize() == package) << "thumbnails are made again";
+    std::list<Fn::Package> more(package);
+    more.push_back(more.back());
+    EXPECT_EQ(thrownBy([&] { Cmp::getImageDataFromSerializedEvidence(Fn::Package(more)); }).substr(0, 11),
+              "FNEBadArg: ");
     const FaceStream stream("a", evidence);
     EXPECT_EQ(Cmp::getFirstFrameFromSerializedTrackedObjectData(stream.serialize())->w(), 200u);
     EXPECT_EQ(thrownBy([&] { Cmp::getImageDataFromSerializedEvidence(Fn::Package(1)); }).substr(0, 11),

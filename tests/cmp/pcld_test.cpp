@@ -192,6 +192,30 @@ TEST(Preprocessor, NormalizationTakesContrastOut) {
     EXPECT_EQ(thrownBy([] { PCLD::initializePreprocessor("GPyr", l5Params('x')); }), refusal);
 }
 
+TEST(Preprocessor, EachTypeTakesParametersOfItsKind) {
+    const GaborPyrProcessor::Params plain{80, 80, 2, 5, 4, 4.0f, 8, 8, 0, 0, 6.2831855f};
+    const FNImage<float> image = randomImage(80, 80, 4);
+    const Vector unprocessed = GaborPyrProcessor(plain)(image),
+                 ranks = GaborPyrRankNormProcessor(l5Params('x'))(image);
+    for (const std::string type :
+         {"GPyr", "GPyrENRLH", "B4Preprocessor", "GPyrNoPreproc", "GPyrRankNormNoPreproc", "other"}) {
+        const bool takesPlain = type.starts_with("GPyr") && !type.starts_with("GPyrRank");
+        const auto check = [&](bool taken, const auto& params, const Vector& expected, const char* same) {
+            if (!taken) {
+                EXPECT_EQ(thrownBy([&] { PCLD::initializePreprocessor(type, params); }).substr(0, 45),
+                          ("FNEBadArg: PCLD: Configured preprocessor " + type + " is not").substr(0, 45));
+                return;
+            }
+            const auto made = PCLD::initializePreprocessor(type, params);
+            EXPECT_EQ(made->algorithmName(), type);
+            EXPECT_EQ(made->featureSize(), expected.size());
+            EXPECT_EQ((*made)(image) == expected, type == same) << type;
+        };
+        check(takesPlain, plain, unprocessed, "GPyrNoPreproc");
+        check(!takesPlain && type != "other", l5Params('x'), ranks, "GPyrRankNormNoPreproc");
+    }
+}
+
 TEST(Cluster, SettlesInOrderUpToTheFirstThatMoves) {
     // Numbers around means; each centre tells how often it was asked to settle.
     struct Mean {

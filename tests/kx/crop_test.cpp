@@ -1,7 +1,9 @@
 #include "fn/deployment/app_config_db.h"
 #include "fn/image_conversion.h"
+#include "kx/facegeo.h"
 #include "kx/full_frontal_creator.h"
 #include "kx/token_face.h"
+#include "support/settings.h"
 #include "support/thrown_text.h"
 
 #include <gtest/gtest.h>
@@ -132,6 +134,30 @@ TEST(FullFrontalCreator, CarriesEveryAnnotationOver) {
     expectNear(picture.nasion(), picture.faceFinderLocation().pos, 0.1f);
     expectNear(picture.mouth() - picture.nasion(), turned(FNPos(-10, 50) * scale, {}, -0.2f), 0.3f);
     EXPECT_EQ(picture.mouthLocation().confidence, 3);
+    ASSERT_TRUE(picture.hasNasionInfo());
+    EXPECT_EQ(picture.nasionLocation().confidence, 3);
+    EXPECT_NEAR(picture.nasionLocation().size, 60 * scale, 0.3);
+}
+
+TEST(FaceGeometry, EstimatesTheOutlineAlongAndAcrossTheEyes) {
+    const FaceGeometry geometry(settingsOf<FaceGeometry>());
+    // Eyes 100 apart on a slope of 4 to 3, either way: sides and ends of the head lie to the same sides.
+    for (const auto& [left, right] :
+         {std::pair{FNPos(100, 100), FNPos(160, 180)}, {FNPos(100, 180), FNPos(160, 100)}}) {
+        const FaceGeometry::Points points = geometry.completed({left, right, {}, {}, {}, {}});
+        expectNear(points.leftEar, {130 - 66, 140 - 88}, 1e-3f);
+        expectNear(points.rightEar, {130 + 66, 140 + 88}, 1e-3f);
+        expectNear(points.crown, {130 - 133.52f, 140 - 100.14f}, 1e-3f);
+        expectNear(points.chin, {130 + 141.28f, 140 + 105.96f}, 1e-3f);
+    }
+    const FaceGeometry::Points level = geometry.completed({{100, 100}, {200, 100}, {7, 8}, {}, {}, {}});
+    expectNear(level.chin, {7, 8}, 0);
+    expectNear(level.crown, {150, 100 - 166.9f}, 1e-3f);
+    expectNear(level.rightEar, {260, 100}, 1e-3f);
+    EXPECT_EQ(thrownText<FNEBadArg>([&] {
+                  geometry.completed({{100, 100}, {100, 200}, {}, {}, {}, {}});
+              }),
+              "Invalid eye locations set. Both x values are the same.");
 }
 
 TEST(FullFrontalCreator, RefusesWhatTheStandardForbids) {
@@ -316,6 +342,12 @@ TEST(TokenFace, LimitsItsPadding) {
             EXPECT_EQ(padded(*produce, 0.11f, distance), "nothing thrown") << distance;
             EXPECT_EQ(padded(*produce, 0.09f, distance), tooMuchPadding) << distance;
         }
+}
+
+TEST(TokenFace, ScalesTheSizesOfEyes) {
+    const Cmp::Face portrait = face({250, 250}, {330, 250});
+    EXPECT_NEAR(TokenFace::produceImage(portrait, 1, orange).leftEyeLocation().size, 60, 1e-3);
+    EXPECT_NEAR(TokenFace::produceMinimalImage(portrait, 1, orange).rightEyeLocation().size, 45, 1e-3);
 }
 
 TEST(TokenFace, AnImageWhoseEyesCoincideStaysAsItIsAndHasTheEyesOfAToken) {

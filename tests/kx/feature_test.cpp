@@ -56,6 +56,13 @@ TEST(FeatureTest, ASetSurvivesPackingAndComesFromSettings) {
     ASSERT_EQ(elements.size(), 4u);
     EXPECT_EQ(elements.front().cores().front().size(), 1u);
     std::list<Fn::Package> wrong = elements;
+    wrong.push_back(Fn::Package(1.0f));
+    EXPECT_EQ(thrownBy([&] { Set{Fn::Package(wrong)}; }).substr(0, 9), "FNEBadArg");
+    wrong = elements;
+    *std::next(wrong.begin(), 2) = Fn::Package(3);
+    EXPECT_EQ(thrownBy([&] { Set{Fn::Package(wrong)}; }),
+              "FNEBadArg: Kx::Feature::EthnicityConfig::valueToString: unknwon ethnicity 3");
+    wrong = elements;
     *std::next(wrong.begin()) = Fn::Package(2);
     EXPECT_EQ(thrownBy([&] { Set{Fn::Package(wrong)}; }),
               "FNEBadArg: Kx::Feature::GenderEnumDef::toString: unknown gender 2");

@@ -133,6 +133,12 @@ TEST(FullFrontalTest, TintOnlyMattersInGlasses) {
     EXPECT_FALSE(assessed(dark).isCompliant());
     dark["eye1Tinted"] = 33;
     EXPECT_TRUE(assessed(dark).noTintedGlasses());
+    dark["eye0Tinted"] = 33;
+    EXPECT_TRUE(assessed(dark).noTintedGlasses());
+    dark["eye0Tinted"] = 34;
+    EXPECT_FALSE(assessed(dark).noTintedGlasses());
+    dark["glasses"] = -0.8f;
+    EXPECT_TRUE(assessed(dark).noTintedGlasses());
 }
 
 TEST(FullFrontalTest, LimitsAreSettings) {
@@ -184,6 +190,11 @@ TEST(FullFrontalTest, ResultsSurvivePacking) {
     EXPECT_FALSE(read.isCompliant());
     EXPECT_EQ(read.serialize(), original.serialize());
     EXPECT_EQ(thrownBy([] { Compliance(Fn::Package(true)); }).substr(0, 9), "FNEBadArg");
+    for (const bool more : {false, true}) {
+        std::list<Fn::Package> elements(original.serialize());
+        more ? elements.push_back(Fn::Package(true)) : elements.pop_back();
+        EXPECT_EQ(thrownBy([&] { Compliance{Fn::Package(elements)}; }).substr(0, 9), "FNEBadArg") << more;
+    }
 }
 
 TEST(FullFrontalTest, SummariesStopAtTheFirstFailure) {

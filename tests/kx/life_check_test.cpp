@@ -32,7 +32,10 @@ bool alive(const FNImage<unsigned char>& image, const FNImage<unsigned char>& re
 TEST(LifeChecker, AFlatPictureIsNotAlive) {
     EXPECT_FALSE(alive(seen(0), seen(0)));
     EXPECT_FALSE(alive(seen(0, 0, 0.7), seen(0))) << "in other light";
-    EXPECT_FALSE(alive(seen(0), seen(0), {1, 1})) << "with eyes that were found elsewhere";
+    for (const float x : {-1.5f, 0.0f, 1.5f})
+        for (const float y : {-1.5f, 0.0f, 1.5f})
+            EXPECT_FALSE(alive(seen(0), seen(0), {x, y}))
+                << "with eyes that were found elsewhere " << x << " " << y;
     EXPECT_FALSE(alive(seen(0, 0.004), seen(0))) << "that is leant back";
     EXPECT_FALSE(alive(seen(0), seen(0, 0.004)));
 }
