@@ -45,11 +45,9 @@ typedef struct orbekCamera {
     void (*close)(void* self);
 } orbekCamera;
 
-/** What a plug-in exports under the name "orbekOpenCamera".
- * @param interfaceVersion ORBEK_CAMERA_INTERFACE of the library
- * @param name of the device in the configuration
- * @param[out] camera comes zeroed
- * @return 0, or something else and the reason in `error`; the camera is not closed then */
+/** What a plug-in exports under the name "orbekOpenCamera". It is told the ORBEK_CAMERA_INTERFACE of the
+ * library and the name of the device in the configuration, and fills in a camera, which comes zeroed. It
+ * returns 0, or something else and the reason in `error`; the camera is not closed then. */
 typedef int orbekOpenCameraFunction(unsigned int interfaceVersion, const char* name, orbekCamera* camera,
                                     char* error);
 

@@ -55,6 +55,16 @@ TEST(CaptureDevice, PlaysTheFilesOfTheConfigurationInTurn) {
     EXPECT_NO_THROW(device->setVideoFormat(device->getVideoFormat()));
 }
 
+TEST(CaptureDevice, TheReadyMadeOneShowsTheSamplePeople) {
+    const CaptureDevice device =
+        createCaptureDevice(configured("ORBEK.Substitutions.INSTALLDIR = $ORBEKDIR\n"), "Files");
+    for (const unsigned int height : {426u, 426u, 426u}) {
+        const Image image = device->capture();
+        EXPECT_EQ(image->height(), height);
+        EXPECT_TRUE(image->isColor());
+    }
+}
+
 TEST(CaptureDevice, WithoutASourceSaysSo) {
     const RecordedDialog dialog;
     const Film empty(0);

@@ -143,6 +143,23 @@ private:
     std::vector<Image>& delivered_;
 };
 
+/// Gray, and counts when it goes.
+class Mortal final : public ImageBody {
+public:
+    explicit Mortal(int& gone) : gone_(gone) {}
+    ~Mortal() override { ++gone_; }
+    bool isColor() const override { return false; }
+    unsigned int width() const override { return 40; }
+    unsigned int height() const override { return 30; }
+    const unsigned char* grayScaleRepresentation() const override { return pixels_.data(); }
+    const Rgb* colorRepresentation() const override { return nullptr; }
+    std::string name() const override { return "mortal"; }
+
+private:
+    int& gone_;
+    std::vector<unsigned char> pixels_ = std::vector<unsigned char>(40 * 30, 7);
+};
+
 // ---- processors
 
 /// The comparison has random weights, and a mapping from raw scores of 0 to 4000 to scores.
@@ -257,6 +274,37 @@ TEST_F(ProcessorsWithModels, AVerificationEndsWithTheFirstMatch) {
     calls.text.clear();
     processor.process(samples.begin(), two, fir, threshold, verification(calls));
     EXPECT_EQ(calls.text, "start image eyes50 score image blind noMatch end ");
+
+    int gone = 0;
+    {
+        const std::list<Sample> more{person(1), Sample(Image(new Mortal(gone)))};
+        calls.text.clear();
+        processor.process(more.begin(), more.end(), fir, 0, verification(calls));
+        EXPECT_EQ(calls.text, "start image eyes50 score match end ");
+    }
+    EXPECT_EQ(gone, 1) << "the processor keeps no image that it has not come to";
+}
+
+TEST_F(ProcessorsWithModels, AMergedRecordHasTheFeaturesOfBoth) {
+    const Configuration c = configuration();
+    const Enrollment::Processor processor(c);
+    const FIR first = record(c, {person(1)}), second = record(c, {person(2)});
+    const auto bytes = [](const FIR& fir) {
+        std::ostringstream stream;
+        fir.serialize(stream);
+        return stream.str();
+    };
+    const auto place = [&](const FIR& merged, const FIR& part) {
+        constexpr std::size_t enough = 500;
+        const std::string feature = bytes(part);
+        return bytes(merged).find(feature.substr(feature.size() - enough));
+    };
+    for (const auto& [one, other] : {std::pair{first, second}, {second, first}}) {
+        const FIR merged = processor.merge(one, other);
+        ASSERT_NE(place(merged, one), std::string::npos);
+        ASSERT_NE(place(merged, other), std::string::npos);
+        EXPECT_GT(place(merged, one), place(merged, other)) << "the old one is the second, and comes first";
+    }
 }
 
 TEST_F(ProcessorsWithModels, AnIdentificationSeesThePopulationOfTheMoment) {

@@ -46,6 +46,12 @@ std::string fieldText(std::string key, const Json& value) {
     return key + " " + valueText(value);
 }
 
+/// "1 match", "2 matches". @param things plural, as lists are named
+std::string countText(std::size_t count, std::string things) {
+    if (count == 1) things.resize(things.size() - (things.ends_with("ches") ? 2 : 1));
+    return std::to_string(count) + " " + things;
+}
+
 } // namespace
 
 Output::Output(const CommonOptions& options, std::size_t steps)
@@ -108,7 +114,7 @@ std::string readableText(const nlohmann::ordered_json& json) {
         }
         fields += fields.empty() ? "" : ", ";
         const bool list = value.is_array() && (value.empty() || value.front().is_object());
-        fields += list ? std::to_string(value.size()) + " " + key : fieldText(key, value);
+        fields += list ? countText(value.size(), key) : fieldText(key, value);
         if (list)
             for (const Json& element : value) lists += "\n  " + readableText(element);
     }

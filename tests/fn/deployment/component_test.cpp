@@ -8,6 +8,9 @@
 
 #include <gtest/gtest.h>
 
+#include <functional>
+#include <thread>
+
 namespace {
 
 using namespace Fn::Deployment;
@@ -162,6 +165,19 @@ TEST_F(ComponentTree, HooksStandInForStoredValues) {
               (std::vector<std::string>{"warn: Error on read hook of component R.Flag: gone",
                                         "warn: Error on write hook of component R.Flag: full"}));
     EXPECT_EQ(db_->get("R.Flag"), "x");
+}
+
+TEST_F(ComponentTree, HooksMayWaitForThreadsThatSetHooks) {
+    const Component tree = root();
+    Component flag = tree.subComponent("Flag"), other = tree.subComponent("Lens");
+    const auto inAnotherThread = [](const std::function<void()>& call) { std::thread(call).join(); };
+    flag.setReadHook([&] {
+        inAnotherThread([&] { other.removeReadHook(); });
+        return std::string("true");
+    });
+    flag.setWriteHook([&](const std::string&) { inAnotherThread([&] { other.removeWriteHook(); }); });
+    EXPECT_EQ(flag.read(true), "true");
+    EXPECT_NO_THROW(flag.write("x"));
 }
 
 TEST_F(ComponentTree, ChildrenFollowTheKindOfNode) {

@@ -71,9 +71,15 @@ TEST_F(ConfiguratorTest, RootsComeAndGoWithEvents) {
     addTree("Z");
     addTree("A");
     EXPECT_EQ(machine_.subComponents(""), (Names{"A", "Z"}));
+    const FNCountedPtr<AppConfigDB> other(new AppVolatileConfigDB);
+    other->set("Z.x", "7");
+    machine_.addRootComponent(Component(other, Property(type<Top>(), "Z", "", "", false)));
+    EXPECT_EQ(machine_.value("Z.x", false), "7") << "the new root is in place of the old one";
+    EXPECT_EQ(events, "+A+Z-A+A-Z+Z");
+    events.clear();
     machine_.removeRootComponent("nobody");
     machine_.removeRootComponent("A");
-    EXPECT_EQ(events, "+A+Z-A+A-A");
+    EXPECT_EQ(events, "-A");
     EXPECT_EQ(machine_.subComponents(""), Names{"Z"});
 }
 

@@ -99,6 +99,8 @@ TEST(CompositeValues, DescribeThemselves) {
     EXPECT_EQ(option.id(), "Option<Shape>");
     EXPECT_EQ(findProperty(option.properties(), "Enabled")->doc(), "Option enabled: A shape.");
     EXPECT_EQ((type<Matrix<Int, 2, 1>>().properties().back().name()), "1,0");
+    EXPECT_EQ((type<Matrix<Int, 2, 3>>().properties().size()), 6u);
+    EXPECT_EQ((type<Vector<Int, 3>>().properties().size()), 3u);
 }
 
 TEST(CompositeValues, AllowTheirWordsOnly) {
@@ -136,6 +138,8 @@ TEST(CompositeValues, IdListsSplitAtTheOutermostCommas) {
     EXPECT_EQ(getAllValues(type<Alternative<Shapes>>()), (Names{"Circle", "Nothing"}));
     EXPECT_EQ(getAllValues(type<Colour>()), (Names{"Red", "Green"}));
     EXPECT_TRUE(getAllValues(type<Float>()).empty());
+    for (const char* none : {"Enum", "Enum<A", "Enum A>", "A>B<"})
+        EXPECT_TRUE(EnumBase::enumeration(none).empty());
 }
 
 TEST(CompositeValues, MissingInnerTypesAreNamed) {

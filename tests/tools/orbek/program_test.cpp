@@ -134,6 +134,15 @@ TEST(OrbekToolWithModels, SaysWhatStopsIt) {
     EXPECT_EQ(scratch.read("none.conf"), "ORBEK.Substitutions.INSTALLDIR = /no/such\n");
 }
 
+TEST(OrbekToolWithModels, ResultsForPeopleCountInTheirLanguage) {
+    const ScratchFolder scratch;
+    const std::string gray = writeRamp(scratch, "a.pgm", 50, 40),
+                      bob = ORBEK_SOURCE_DIR "/examples/images/bob1.jpg";
+    const ProgramRun found = runOrbek({"find", gray, bob});
+    EXPECT_NE(found.output.find("width 50, height 40, 0 faces\n"), std::string::npos) << found.output;
+    EXPECT_NE(found.output.find(", 1 face\n  x "), std::string::npos) << found.output;
+}
+
 TEST(OrbekToolWithModels, PicturesOfOneNameAreDrawnIntoFilesOfTheirOwn) {
     const ScratchFolder scratch;
     fs::create_directory(scratch.path() / "sub");
