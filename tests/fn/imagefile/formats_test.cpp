@@ -283,6 +283,13 @@ TEST(Jpeg2000, ReadsBackEveryPixelType) {
     EXPECT_FALSE(std::filesystem::exists(workshop.path("x")));
     EXPECT_THROW(Fn::writeJ2k(Factory::create(FNImage<unsigned char>()), "jp2", workshop.path("x")),
                  FNEBadArg);
+    std::string noSize = bytesOfFile(workshop.path("pixel.jp2"));
+    const std::size_t codeStream = noSize.find("\xFF\x4F\xFF\x51");
+    const std::string cut = noSize.substr(0, codeStream + 20);
+    noSize[codeStream + 3] = 0x52;
+    for (const std::string& damaged : {noSize, cut})
+        EXPECT_EQ(thrownBy([&] { Fn::loadJ2k(damaged.data(), damaged.size()); }),
+                  "FNEBadFormat: Fn::readJ2k: Failed to decode JPEG2000 image from given stream.");
     EXPECT_EQ(thrownBy([&] { Fn::loadJ2k("P5 1 1 255\nx", 12); }),
               "FNEBadFormat: Fn::readJ2k: stream does not refer to a known JPEG2000 image format.");
 }
@@ -647,7 +654,7 @@ TEST(Bmp, RunLengthsGiveTheirPixels) {
         {"rows beyond the picture", "1", 2, 1, "\2\1" + row + "\2\2" + end, "11"},
         {"an early end", "1", 2, 2, "\2\1" + end, "0011"},
         {"no end mark", "1", 2, 1, "\2\1", "11"},
-        {"halves of bytes in turn", "2", 5, 1, "\5\x12" + end, "12121"},
+        {"halves of bytes in turn", "2", 5, 1, "\5\x1F" + end, "1?1?1"},
         {"stored halves", "2", 5, 1, std::string("\0\5\x12\x34\x50\0", 6) + end, "12345"},
         {"stored halves of whole words", "2", 6, 1, std::string("\0\4\x12\x34\2\x56", 6) + end, "123456"},
     };
@@ -735,6 +742,12 @@ TEST(Bmp, RefusesInItsOwnWords) {
         {bmpFile(1, 1, 16, "UYVY", "", "abcd"), "FNEBadArg: Unknown biCompression type"},
         {bmpFile(1, 1, 17, "0", "", "abcd"), "FNEBadArg: BMP Error: biBitCount 17 not supported"}};
     for (const auto& c : cases) EXPECT_EQ(thrownBy([&] { readBmp(c.file); }), c.failure);
+    for (const std::size_t at : {14u, 15u, 16u, 17u}) { // the size of the header
+        std::string wrong = whole;
+        ++wrong[at];
+        EXPECT_EQ(thrownBy([&] { readBmp(wrong); }),
+                  "FNESysError: BMP Error: Unknown BMP type or wrong header");
+    }
 }
 
 TEST(Bmp, ModesAreToldBeforeTheRefusal) {
