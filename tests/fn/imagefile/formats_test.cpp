@@ -156,6 +156,16 @@ TEST(Jpeg, WritesWhatItReads) {
     EXPECT_EQ(read.toBgra32()(3, 3).a, 255);
 }
 
+TEST(Jpeg, LongFilesAreWhole) {
+    FNImage<unsigned char> noise(500, 500);
+    std::mt19937 random(5);
+    for (FNImIter<unsigned char> it(noise, noise.box()); !it.atEnd(); ++it)
+        *it = static_cast<unsigned char>(random());
+    const std::string bytes = text(Fn::writeJpeg(Factory::create(noise), 100));
+    EXPECT_GT(bytes.size(), 200000u);
+    EXPECT_LE(largestDifference(Fn::readJpeg(bytes.data(), bytes.size()), Factory::create(noise)), 3);
+}
+
 TEST(Jpeg, TheSizeConstraintLowersTheQualityStepByStep) {
     const FNImageReference image = Factory::create(colorPicture());
     const auto size = [&](int quality) { return static_cast<int>(Fn::writeJpeg(image, quality).size()); };
@@ -387,6 +397,10 @@ TEST(Tiff, LoadingNamesTheFile) {
               "FNEIOError: TIFF File " + workshop.path("absent") + " does not exist ");
     EXPECT_EQ(thrownBy([&] { Fn::loadTiff(text); }),
               "FNEIOError: TIFF File " + text + " might be not in TIFF format");
+    std::string damaged = bytesOfFile(fixture("tiff/rgb_deflate.tif"));
+    damaged.replace(8, 4, 4, '\xFF');
+    EXPECT_EQ(thrownBy([&] { Fn::readImage(damaged.data(), damaged.size()); }),
+              "FNEBadFormat: TIFFReadScanline: bad data read on line 0");
     std::istringstream stream("II no tiff");
     EXPECT_EQ(thrownBy([&] { Fn::readTiff(stream, "some stream", 0); }),
               "FNEBadFormat: Fn::readTiff(): stream might be not in TIFF format (some stream)");
@@ -721,6 +735,16 @@ TEST(Bmp, GrayPathKeepsGrayValues) {
     bitmap.info.compression = 0x32595559;
     EXPECT_EQ(thrownBy([&] { Fn::bmp2ByteImg(bitmap); }),
               "FNEBadArg: biCompression type 844715353(FourCC: YUY2) not supported");
+    for (const std::uint32_t coding : {0u, 0x30303859u, 0x32595559u, 0x30323449u}) {
+        const Fn::Bitmap few{{2, 2, 1, 8, coding, 0, 0, 0, 0, 0}, {}, {1, 2, 3}};
+        EXPECT_EQ(thrownBy([&] {
+                      if (coding == 0x30303859)
+                          Fn::bmp2ByteImg(few);
+                      else
+                          Fn::bmp2ColorImg(few);
+                  }),
+                  "FNEBadArg: BMP Error: too few pixels");
+    }
     const Fn::Bitmap white{{1, 1, 1, 24, 0, 0, 0, 0, 0, 0}, {}, {255, 255, 255}};
     EXPECT_EQ(Fn::bmp2ByteImg(white)(0, 0), 254);
 }
@@ -738,6 +762,8 @@ TEST(Bmp, RefusesInItsOwnWords) {
         {whole.substr(0, 54 + 1025), "FNEIOError: BMP Error: reading BMP pixels"},
         {bmpFile(0, 5, 24, "0", "", ""), "FNEIOError: BMP Error: got image with size 0"},
         {bmpFile(1, 1, 0, "0", std::string(4, '\0'), ""), "FNEIOError: BMP Error: got image with size 0"},
+        {bmpFile(2, 0, 24, "0", "", "abcd"), "FNEIOError: BMP Error: got image with size 0"},
+        {bmpFile(-2, 1, 24, "0", "", "abcd"), "FNEIOError: BMP Error: got image with size 0"},
         {bmpFile(1, 1, 32, "RGB5", "", "abcd"), "FNESysError: Wrong biCompression hint with biBitCount 32"},
         {bmpFile(1, 1, 16, "UYVY", "", "abcd"), "FNEBadArg: Unknown biCompression type"},
         {bmpFile(1, 1, 17, "0", "", "abcd"), "FNEBadArg: BMP Error: biBitCount 17 not supported"}};
