@@ -13,7 +13,7 @@
 namespace Fn {
 
 /// Reads JPEG, PNG, JPEG 2000, TIFF, PGM, PPM and BMP, told apart by their first bytes; the file form also
-/// looks into a gzip file.
+/// looks into a gzip file. With limits.rareVariants also PBM and what else each reader's header tells.
 /// @throws FNEBadArg if the bytes are of no known format; FNEIOError if the file or stream cannot be read;
 /// what the format's reader throws.
 FNImageReference readImage(const std::string& fileName, const ReadImagePropertiesFeedback& feedback = {},

@@ -156,6 +156,16 @@ TEST(Jpeg, WritesWhatItReads) {
     EXPECT_EQ(read.toBgra32()(3, 3).a, 255);
 }
 
+TEST(Jpeg, LongFilesAreWhole) {
+    FNImage<unsigned char> noise(500, 500);
+    std::mt19937 random(5);
+    for (FNImIter<unsigned char> it(noise, noise.box()); !it.atEnd(); ++it)
+        *it = static_cast<unsigned char>(random());
+    const std::string bytes = text(Fn::writeJpeg(Factory::create(noise), 100));
+    EXPECT_GT(bytes.size(), 200000u);
+    EXPECT_LE(largestDifference(Fn::readJpeg(bytes.data(), bytes.size()), Factory::create(noise)), 3);
+}
+
 TEST(Jpeg, TheSizeConstraintLowersTheQualityStepByStep) {
     const FNImageReference image = Factory::create(colorPicture());
     const auto size = [&](int quality) { return static_cast<int>(Fn::writeJpeg(image, quality).size()); };
@@ -283,6 +293,13 @@ TEST(Jpeg2000, ReadsBackEveryPixelType) {
     EXPECT_FALSE(std::filesystem::exists(workshop.path("x")));
     EXPECT_THROW(Fn::writeJ2k(Factory::create(FNImage<unsigned char>()), "jp2", workshop.path("x")),
                  FNEBadArg);
+    std::string noSize = bytesOfFile(workshop.path("pixel.jp2"));
+    const std::size_t codeStream = noSize.find("\xFF\x4F\xFF\x51");
+    const std::string cut = noSize.substr(0, codeStream + 20);
+    noSize[codeStream + 3] = 0x52;
+    for (const std::string& damaged : {noSize, cut})
+        EXPECT_EQ(thrownBy([&] { Fn::loadJ2k(damaged.data(), damaged.size()); }),
+                  "FNEBadFormat: Fn::readJ2k: Failed to decode JPEG2000 image from given stream.");
     EXPECT_EQ(thrownBy([&] { Fn::loadJ2k("P5 1 1 255\nx", 12); }),
               "FNEBadFormat: Fn::readJ2k: stream does not refer to a known JPEG2000 image format.");
 }
@@ -380,6 +397,10 @@ TEST(Tiff, LoadingNamesTheFile) {
               "FNEIOError: TIFF File " + workshop.path("absent") + " does not exist ");
     EXPECT_EQ(thrownBy([&] { Fn::loadTiff(text); }),
               "FNEIOError: TIFF File " + text + " might be not in TIFF format");
+    std::string damaged = bytesOfFile(fixture("tiff/rgb_deflate.tif"));
+    damaged.replace(8, 4, 4, '\xFF');
+    EXPECT_EQ(thrownBy([&] { Fn::readImage(damaged.data(), damaged.size()); }),
+              "FNEBadFormat: TIFFReadScanline: bad data read on line 0");
     std::istringstream stream("II no tiff");
     EXPECT_EQ(thrownBy([&] { Fn::readTiff(stream, "some stream", 0); }),
               "FNEBadFormat: Fn::readTiff(): stream might be not in TIFF format (some stream)");
@@ -647,7 +668,7 @@ TEST(Bmp, RunLengthsGiveTheirPixels) {
         {"rows beyond the picture", "1", 2, 1, "\2\1" + row + "\2\2" + end, "11"},
         {"an early end", "1", 2, 2, "\2\1" + end, "0011"},
         {"no end mark", "1", 2, 1, "\2\1", "11"},
-        {"halves of bytes in turn", "2", 5, 1, "\5\x12" + end, "12121"},
+        {"halves of bytes in turn", "2", 5, 1, "\5\x1F" + end, "1?1?1"},
         {"stored halves", "2", 5, 1, std::string("\0\5\x12\x34\x50\0", 6) + end, "12345"},
         {"stored halves of whole words", "2", 6, 1, std::string("\0\4\x12\x34\2\x56", 6) + end, "123456"},
     };
@@ -714,6 +735,16 @@ TEST(Bmp, GrayPathKeepsGrayValues) {
     bitmap.info.compression = 0x32595559;
     EXPECT_EQ(thrownBy([&] { Fn::bmp2ByteImg(bitmap); }),
               "FNEBadArg: biCompression type 844715353(FourCC: YUY2) not supported");
+    for (const std::uint32_t coding : {0u, 0x30303859u, 0x32595559u, 0x30323449u}) {
+        const Fn::Bitmap few{{2, 2, 1, 8, coding, 0, 0, 0, 0, 0}, {}, {1, 2, 3}};
+        EXPECT_EQ(thrownBy([&] {
+                      if (coding == 0x30303859)
+                          Fn::bmp2ByteImg(few);
+                      else
+                          Fn::bmp2ColorImg(few);
+                  }),
+                  "FNEBadArg: BMP Error: too few pixels");
+    }
     const Fn::Bitmap white{{1, 1, 1, 24, 0, 0, 0, 0, 0, 0}, {}, {255, 255, 255}};
     EXPECT_EQ(Fn::bmp2ByteImg(white)(0, 0), 254);
 }
@@ -731,10 +762,18 @@ TEST(Bmp, RefusesInItsOwnWords) {
         {whole.substr(0, 54 + 1025), "FNEIOError: BMP Error: reading BMP pixels"},
         {bmpFile(0, 5, 24, "0", "", ""), "FNEIOError: BMP Error: got image with size 0"},
         {bmpFile(1, 1, 0, "0", std::string(4, '\0'), ""), "FNEIOError: BMP Error: got image with size 0"},
+        {bmpFile(2, 0, 24, "0", "", "abcd"), "FNEIOError: BMP Error: got image with size 0"},
+        {bmpFile(-2, 1, 24, "0", "", "abcd"), "FNEIOError: BMP Error: got image with size 0"},
         {bmpFile(1, 1, 32, "RGB5", "", "abcd"), "FNESysError: Wrong biCompression hint with biBitCount 32"},
         {bmpFile(1, 1, 16, "UYVY", "", "abcd"), "FNEBadArg: Unknown biCompression type"},
         {bmpFile(1, 1, 17, "0", "", "abcd"), "FNEBadArg: BMP Error: biBitCount 17 not supported"}};
     for (const auto& c : cases) EXPECT_EQ(thrownBy([&] { readBmp(c.file); }), c.failure);
+    for (const std::size_t at : {14u, 15u, 16u, 17u}) { // the size of the header
+        std::string wrong = whole;
+        ++wrong[at];
+        EXPECT_EQ(thrownBy([&] { readBmp(wrong); }),
+                  "FNESysError: BMP Error: Unknown BMP type or wrong header");
+    }
 }
 
 TEST(Bmp, ModesAreToldBeforeTheRefusal) {

@@ -178,6 +178,13 @@ TEST(ImageGoldens, TextsOfModes) {
                                  "LOGLUV (CIE Log2(L) (u',v'))",
                                  "MASK  (TIFF COLOR: holdout mask)",
                                  "SEPARATED (tiff color: color separations)"};
+    using enum Fn::FNImageDataCompressionMode;
+    int number = 0;
+    for (const auto mode :
+         {Unknown, Rgb,    Rgba,   Alpha,  Intensity, Palette, YCbCr, Yuy2,     YCbCrK, Cmyk,
+          Yvyu,    Uyvy,   Rle8,   Rle4,   BitFields, Yvu9,    Yv12,  I420,     Iyuv,   Y800,
+          Y8,      CieLab, IccLab, ItuLab, LogL,      LogLuv,  Mask,  Separated})
+        EXPECT_EQ(static_cast<int>(mode), number++);
     for (int mode = 0; mode < 28; ++mode)
         EXPECT_EQ(Fn::compressionModeToString(static_cast<Fn::FNImageDataCompressionMode>(mode)),
                   texts[mode]);
