@@ -87,7 +87,8 @@ void writeWholeFile(const std::string& fileName, const std::function<void(std::o
         refuse(fileName, errno);
     }
     std::error_code noLink;
-    for (fs::path next; next = fs::read_symlink(target, noLink), !noLink;) target = target.parent_path() / next;
+    for (fs::path next; next = fs::read_symlink(target, noLink), !noLink;)
+        target = target.parent_path() / next;
     UnfinishedFile unfinished(target.has_parent_path() ? target.parent_path() : ".", permissions, fileName);
     fill(unfinished.path(), fileName, write);
     if (!unfinished.rename(target)) refuse(fileName, errno);

@@ -1,10 +1,10 @@
 #include "fn/whole_file.h"
 
+#include "fn/imagefile/bmp.h"
 #include "fn/imagefile/image_file.h"
 #include "fn/imagefile/j2k.h"
 #include "fn/imagefile/jpeg.h"
 #include "fn/imagefile/pbm.h"
-#include "fn/imagefile/bmp.h"
 #include "support/scratch_folder.h"
 #include "support/thrown.h"
 

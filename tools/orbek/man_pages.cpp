@@ -4,8 +4,8 @@
 #include "whole_file.h"
 
 #include <filesystem>
-#include <sstream>
 #include <memory>
+#include <sstream>
 
 namespace Orbek::Tool {
 namespace {

@@ -12,8 +12,8 @@
 
 namespace Fn {
 
-/// The header BITMAPINFOHEADER behind its size, in stored order. Later headers, of 52 to 124 bytes, begin with
-/// it; masks of red, green, blue and alpha follow, and what tells of colour spaces.
+/// The header BITMAPINFOHEADER behind its size, in stored order. Later headers, of 52 to 124 bytes, begin
+/// with it; masks of red, green, blue and alpha follow, and what tells of colour spaces.
 struct BitmapInfo {
     std::int32_t width;
     std::int32_t height; ///< negative: rows lie top to bottom
@@ -72,10 +72,10 @@ FNImage<Bgra32> bmp2ColorImg(const Bitmap& bitmap);
 
 /// Reads a file. 8 bits without a colour table of their own, "Y800" and "Y8  " give mono8, all else bgra32.
 /// The first two bytes are not looked at. The pixels begin where the file header tells, unless that is within
-/// the headers or the colour table; then they follow these. Rare variants are RLE4, RLE8 and later headers than
-/// that of 40 bytes.
-/// @throws FNESysError for a header of another size; FNEBadArg for an unknown coding; FNEIOError if the stream
-/// ends too early; what the conversions throw.
+/// the headers or the colour table; then they follow these. Rare variants are RLE4, RLE8 and later headers
+/// than that of 40 bytes.
+/// @throws FNESysError for a header of another size; FNEBadArg for an unknown coding; FNEIOError if the
+/// stream ends too early; what the conversions throw.
 FNImageReference readBMP(std::istream& stream, const ReadImagePropertiesFeedback& feedback = {},
                          const ImageLimits& limits = {});
 /// @throws FNEIOError if the file cannot be opened.

@@ -127,8 +127,8 @@ public:
           wide_(sampleBytes == 2) {}
 
     void beginRow() {
-        if (!header_.plain && !stream_.read(reinterpret_cast<char*>(row_.data()),
-                                            static_cast<std::streamsize>(row_.size())))
+        if (!header_.plain &&
+            !stream_.read(reinterpret_cast<char*>(row_.data()), static_cast<std::streamsize>(row_.size())))
             FN_THROW(FNEIOError, failure_);
         at_ = 0;
     }
