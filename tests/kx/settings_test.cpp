@@ -132,13 +132,15 @@ TEST(CropSettings, HaveTheirDefaults) {
           {"EyesGazeFrontalThresholdBestPractice", "0.5"}}},
         {feature, {{"WearsGlassesThreshold", "-0.8"}, {"IsMaleThreshold", "0"}}},
     };
-    for (const auto& c : cases)
+    for (const auto& c : cases) {
+        EXPECT_FALSE(c.component.type().hasValue()) << c.component.type().id();
         for (const auto& [path, value] : c.defaults) {
             Fn::Deployment::Component setting = c.component;
             std::istringstream names(path);
             for (std::string name; std::getline(names, name, '.');) setting = setting.subComponent(name);
             EXPECT_EQ(setting.readDefault(), value) << setting.name();
         }
+    }
 }
 
 } // namespace
