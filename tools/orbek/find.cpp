@@ -171,9 +171,9 @@ Command findCommand(CLI::App& program) {
     addImages(*app, options->images);
     app->add_option("--draw", options->drawFolder, "Folder for the pictures with boxes, eyes and ids drawn")
         ->type_name("DIR");
-    app->add_option("--min-eye", options->minEye, "Smallest eye distance, in widths of the image")
+    addShare(*app, "--min-eye", options->minEye, "Smallest eye distance, in widths of the image")
         ->capture_default_str();
-    app->add_option("--max-eye", options->maxEye, "Largest eye distance, in widths of the image")
+    addShare(*app, "--max-eye", options->maxEye, "Largest eye distance, in widths of the image")
         ->capture_default_str();
     app->add_option("--box", options->box, "Where to look: two corners, in pixels of the upright image")
         ->expected(4)

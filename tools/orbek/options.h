@@ -32,7 +32,8 @@ void addImages(CLI::App& command, std::vector<std::string>& images,
 /// Adds how many threads share the work: as many as there are processors, unless told otherwise.
 void addJobs(CLI::App& command, unsigned int& jobs);
 
-/// Adds an option for a rate or a score: a number from 0 to 1, and nothing that is no number.
+/// Adds an option for a rate, a score or a share of a picture: a number from 0 to 1, and nothing that is no
+/// number.
 CLI::Option* addShare(CLI::App& command, const std::string& name, float& share,
                       const std::string& description);
 CLI::Option* addShare(CLI::App& command, const std::string& name, std::optional<float>& share,

@@ -110,10 +110,10 @@ Command trackCommand(CLI::App& program) {
     app->add_option("--draw", options->drawFolder, "Folder for the frames with boxes and track numbers drawn")
         ->type_name("DIR");
     app->add_option("--fps", options->framesPerSecond, "Frames per second; the configuration's otherwise");
-    app->add_option("--min-eye", options->minEye,
-                    "Smallest eye distance, in widths of the image; the configuration's otherwise");
-    app->add_option("--max-eye", options->maxEye,
-                    "Largest eye distance, in widths of the image; the configuration's otherwise");
+    addShare(*app, "--min-eye", options->minEye,
+             "Smallest eye distance, in widths of the image; the configuration's otherwise");
+    addShare(*app, "--max-eye", options->maxEye,
+             "Largest eye distance, in widths of the image; the configuration's otherwise");
     app->add_flag("--sparse", options->sparse,
                   "Look at a part of each frame only, and again around earlier finds");
     return {app, [options] { return track(*options); }};
