@@ -28,7 +28,7 @@ constexpr int drawnQuality = 92;
 /// As a name of a file.
 constexpr const char* standardInput = "-";
 
-constexpr std::array imageEndings{".jpg", ".jpeg", ".png", ".bmp", ".pgm", ".ppm",
+constexpr std::array imageEndings{".jpg", ".jpeg", ".png", ".bmp", ".pbm", ".pgm", ".ppm",
                                   ".pnm", ".jp2",  ".j2k", ".jpc", ".tif", ".tiff"};
 
 bool isImageName(const fs::path& file) {

@@ -149,16 +149,19 @@ TEST(Pictures, FilesThatAreInputsAreNotWrittenOver) {
 
 TEST(Pictures, FoldersAreReplacedByTheirImagesInOrder) {
     const ScratchFolder scratch;
-    for (const char* name : {"f10.png", "f9.PNG", "f9b.jpg", "notes.txt", ".hidden.jpg"})
+    for (const char* name :
+         {"f10.png", "f9.PNG", "f9b.jpg", "f11.pbm", "f12.tif", "notes.txt", ".hidden.jpg"})
         scratch.write(name, "");
     ASSERT_EQ(mkfifo(scratch.file("pipe.jpg").c_str(), 0600), 0);
     std::filesystem::create_directory(scratch.file("folder.jpg"));
     const auto files = pictureFiles({"a.txt", scratch.path().string()});
-    ASSERT_EQ(files.size(), 4u);
+    ASSERT_EQ(files.size(), 6u);
     EXPECT_EQ(files[0], "a.txt");
     EXPECT_EQ(files[1].filename(), "f9.PNG");
     EXPECT_EQ(files[2].filename(), "f9b.jpg");
     EXPECT_EQ(files[3].filename(), "f10.png");
+    EXPECT_EQ(files[4].filename(), "f11.pbm");
+    EXPECT_EQ(files[5].filename(), "f12.tif");
     const ScratchFolder empty;
     EXPECT_EQ(thrownBy([&] { pictureFiles({empty.path().string()}); }),
               "std::exception: " + empty.path().string() + ": has no image files");
