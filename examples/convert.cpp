@@ -1,7 +1,7 @@
 // Converts an image file into another format: convert <input> <output>
 //
-// The input is of any format that the library reads, told apart by its first bytes; only JPEG-LS, which begins like
-// JPEG, is told by its ending. The ending of the output's name chooses what is written.
+// The input is of any format that the library reads, told apart by its first bytes; only JPEG-LS, which
+// begins like JPEG, is told by its ending. The ending of the output's name chooses what is written.
 // Attributes are kept by PGM and PPM files.
 
 #include "fn/imagefile/bmp.h"

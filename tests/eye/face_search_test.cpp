@@ -113,8 +113,8 @@ TEST(FrameScaleSequencer, LooksSparselyAndDenselyWhereSomethingWas) {
     sequencer.setStatus(0, 30, FrameScaleSequencer::candidate);
     sequencer.markFace({40.7f, 20.9f}, 20); // less the centre of the window: (32, 12)
     sequencer.setStatus(50, 0, FrameScaleSequencer::candidate);
-    sequencer.markFace({28, 28}, 13.9f);    // too small a face for this level
-    sequencer.markFace({28, 28}, 28.1f);    // too large
+    sequencer.markFace({28, 28}, 13.9f); // too small a face for this level
+    sequencer.markFace({28, 28}, 28.1f); // too large
     sequencer.markFace({55.5f, 55.5f}, 27.9f);
     sequencer.finalizeFrame();
     sequencer.prepare({}, 60, 55);

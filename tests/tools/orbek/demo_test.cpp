@@ -51,7 +51,8 @@ TEST_F(DemoWithModels, PeopleAreFoundAgainByPicturesThatWereKeptBack) {
     EXPECT_EQ(count(page, "data:image/jpeg"), 9u);
     EXPECT_EQ(count(page, "Who is it?"), 3u);
     EXPECT_NE(page.find("3 of 3"), std::string::npos);
-    EXPECT_NE(page.find("<b>The people of these pictures do not exist: they are drawn by a program"), std::string::npos);
+    EXPECT_NE(page.find("<b>The people of these pictures do not exist: they are drawn by a program"),
+              std::string::npos);
 }
 
 TEST_F(DemoWithModels, FoldersArePeopleAndUselessPicturesAreShownAsSuch) {
