@@ -1,5 +1,5 @@
+#include "shapeimg/scanfile/mesh.h"
 #include "shapeimg/scanfile/scan_file.h"
-
 #include "support/scratch_folder.h"
 #include "support/thrown.h"
 
@@ -187,6 +187,19 @@ std::string vrmlShape(const std::string& picture, double x, const std::string& m
            more + " } }\n";
 }
 
+TEST(ScanMesh, HasEachPairOfCornersOnce) {
+    ShapeImage::Mesh mesh;
+    mesh.vertices = {{1, 0, 0}, {2, 0, 0}};
+    mesh.textureCoordinates = {{0, 0}, {0.5, 1}};
+    mesh.corners = {{1, 0}, {0, 1}, {1, 0}, {0, 0}, {0, 1}};
+    std::vector<TexturedPointSet::CoordinateTextureMapper::Coordinate> coordinates;
+    ShapeImage::appendCoordinates(mesh, 8, 4, 10, 100, coordinates);
+    ASSERT_EQ(coordinates.size(), 3u);
+    mesh.corners.push_back({2, 0});
+    EXPECT_EQ(thrownBy([&] { ShapeImage::appendCoordinates(mesh, 8, 4, 0, 0, coordinates); }),
+              "FNEBadArg: Face refers to a vertex or texture coordinates that are not there");
+}
+
 TEST(VrmlFile, HasShapesWithTextures) {
     const ScratchFolder folder;
     folder.write("a.pgm", pgm(4, 4));
@@ -197,6 +210,14 @@ TEST(VrmlFile, HasShapesWithTextures) {
     EXPECT_EQ(one.points().size(), 4u);
     EXPECT_EQ(at(one, 0, 3), (Vertex{5, 0, 0})) << "y of texture coordinates points up";
     EXPECT_EQ(at(one, 3, 0), (Vertex{1, 1, 0}));
+
+    EXPECT_EQ(read(folder, "s.wrl",
+                   head + "Appearance { texture ImageTexture { url \"c.pgm\" } }\n" +
+                       vrmlShape("a.pgm", 5, "") + "] }")
+                  .texture()
+                  .h(),
+              4u)
+        << "what is outside of shapes is not of the next one";
 
     // Texture coordinates of their own; a second shape's picture lies below the first.
     const TexturedPointSet two = read(folder, "s.wrl",

@@ -2,6 +2,7 @@
 #include "fn/matrix_diagonal.h"
 #include "fn/matrix_product.h"
 #include "fn/matrix_symmetric.h"
+#include "fn/numeric/blas_size.h"
 
 #include "support/thrown_text.h"
 
@@ -309,6 +310,12 @@ TEST(SymmMatrix, ReadsColumnsFromTheDiagonalDown) {
     }
 }
 
+TEST(BlasSize, HasToFitInto32Bits) {
+    EXPECT_EQ(Fn::Numeric::blasSize(0x7FFFFFFF), 0x7FFFFFFF);
+    EXPECT_EQ(thrownText<FNEBadArg>([] { Fn::Numeric::blasSize(0x80000000); }),
+              "Size 2147483648 is too large for the numeric kernels");
+}
+
 TEST(SymmMatrix, ComputesLikeItsFullSquare) {
     const auto a = randomMatrix(4, 4, 6), b = randomMatrix(4, 4, 7);
     SymmMatrix<double> s(4), t(4);
@@ -317,6 +324,12 @@ TEST(SymmMatrix, ComputesLikeItsFullSquare) {
     t = 0.0;
     t.addOuterProducts(a, b);
     expectNear(t.toMatrix(), a.multWithTransposed(b) + b.multWithTransposed(a));
+    auto both = s;
+    both.addOuterProducts(a, b);
+    both.addOuterProducts(a);
+    both.addOuterProduct(a.column(0));
+    const Matrix<double> first(a.column(0));
+    expectNear(both.toMatrix(), s.toMatrix() * 2 + t.toMatrix() + first.multWithTransposed(first));
     expectNear((s + t).toMatrix(), s.toMatrix() + t.toMatrix());
     expectNear((s - t).toMatrix(), s.toMatrix() - t.toMatrix());
     EXPECT_NEAR(s.norm_sq(), s.toMatrix().norm_sq(), 1e-12);
