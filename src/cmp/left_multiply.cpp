@@ -41,7 +41,15 @@ HWY_INLINE std::size_t columnProducts(std::index_sequence<n...>, const short* v,
     if (i < size)
         add(size - lanes,
             hn::IfThenZeroElse(hn::FirstN(d, i - (size - lanes)), hn::LoadU(d, v + size - lanes)));
-    ((out[n] = hn::GetLane(hn::SumOfLanes(wide, hn::Add(sums[n], others[n])))), ...);
+    // In 64 bits: lanes may wrap, but sums of signed numbers outside of vectors must not.
+    const hn::RepartitionToWide<decltype(wide)> widest;
+    const hn::Half<decltype(wide)> half;
+    const auto total = [&](auto sum) HWY_ATTR {
+        const auto both = hn::Add(hn::PromoteTo(widest, hn::LowerHalf(half, sum)),
+                                  hn::PromoteTo(widest, hn::UpperHalf(half, sum)));
+        return static_cast<std::int32_t>(hn::GetLane(hn::SumOfLanes(widest, both)));
+    };
+    ((out[n] = total(hn::Add(sums[n], others[n]))), ...);
     return size;
 }
 #else

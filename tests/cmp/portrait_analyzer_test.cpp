@@ -114,6 +114,9 @@ TEST(PortraitAnalyzer, ValuesSurviveSerializationAndColourDecidesWhichThereAre) 
     EXPECT_EQ(elementsOf(analyzer.analyzeGrayScale(noisyFace()).serialize()), 5u + 24 + 1 - 3);
     const Characteristics grayInColor = analyzer.analyzeColor(noisyFace(false));
     EXPECT_TRUE(grayInColor.isColor());
+    EXPECT_TRUE(analyzer.analyzeColor(noisyFace(false), {}).isColor());
+    EXPECT_FALSE(analyzer.analyzeGrayScale(noisyFace(), {}).isColor());
+    EXPECT_FALSE(analyzer.analyze(noisyFace(false), {}).isColor());
     EXPECT_EQ(grayInColor.eye0Tinted(), gray.eye0Tinted());
 
     const Characteristics read(package);

@@ -168,6 +168,13 @@ TEST(BackgroundUniformity, RejectsNoiseTwoColoursAndObjects) {
     };
     EXPECT_EQ(atShoulder(4), 1);
     EXPECT_EQ(atShoulder(5), 0);
+    const auto besideBody = [](std::uint32_t left) { // which is taken to go from 40 to 120
+        return uniformity([=](auto x, auto y) {
+            return x >= left && x < left + 2 && y <= 128 && y > 119 ? gray(0) : gray(200);
+        });
+    };
+    for (const auto& [left, uniform] : {std::pair{37u, 0.0f}, {40u, 1.0f}, {118u, 1.0f}, {121u, 0.0f}})
+        EXPECT_EQ(besideBody(left), uniform) << left;
 }
 
 TEST(BackgroundUniformity, DoesNotEnlargeWithoutBounds) {
