@@ -3,6 +3,8 @@
 
 #include <gtest/gtest.h>
 
+#include <numeric>
+
 namespace {
 
 struct Tracked {
@@ -83,6 +85,7 @@ TEST(Memory, AViewIsCopiedOnceWhenWrittenWhileShared) {
     EXPECT_EQ(a.data()[1], 1);
     EXPECT_EQ(middle.offset(), 0u);
     EXPECT_EQ(middle.core().size(), 2 * sizeof(int)) << "the copy holds only the view";
+    EXPECT_EQ(middle.data()[1], 2);
     const int* const place = middle.data();
     middle[1] = 20;
     EXPECT_EQ(middle.data(), place);
@@ -96,9 +99,13 @@ TEST(Memory, ASmallViewLeavesALargeBlockThatNobodyElseNeeds) {
     } cases[] = {{7000, 100, 2000, true}, {7000, 100, 3000, false},  {7000, 0, 2333, false},
                  {7000, 0, 2332, true},   {1000000, 5, 1024, false}, {1000000, 5, 1025, true}};
     for (const auto& c : cases) {
-        FNRMem<unsigned char> view(FNRMem<unsigned char>(c.block), c.offset, c.view);
+        FNRMem<unsigned char> block(c.block);
+        std::iota(block.getExclusive(), block.getExclusive() + c.block, static_cast<unsigned char>(0));
+        FNRMem<unsigned char> view(block, c.offset, c.view);
+        block = FNRMem<unsigned char>();
         const unsigned char* const before = view.data();
         view.getExclusive();
+        EXPECT_EQ(view.data()[c.view - 1], static_cast<unsigned char>(c.offset + c.view - 1));
         EXPECT_EQ(view.data() != before, c.moves) << c.block << " " << c.view;
         EXPECT_EQ(view.offset(), c.moves ? 0 : c.offset);
     }

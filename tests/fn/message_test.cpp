@@ -18,6 +18,21 @@ FNTranslator loaded(const std::string& table) {
     return translator;
 }
 
+TEST(StdDialog, WritesALineOfEachKindToItsStream) {
+    FNStdDialog dialog;
+    testing::internal::CaptureStderr();
+    testing::internal::CaptureStdout();
+    dialog.log("a");
+    dialog.info("b");
+    dialog.warn("c");
+    dialog.error("d");
+    const std::string out = testing::internal::GetCapturedStdout(),
+                      err = testing::internal::GetCapturedStderr();
+    EXPECT_TRUE(out.starts_with("[") && out.ends_with("]Info: b\n")) << out;
+    for (const char* const line : {"]a\n", "]Warning: c\n", "]Error: d\n"})
+        EXPECT_NE(err.find(line), std::string::npos) << line;
+}
+
 TEST(Translator, TakesTheTextsOfItsLanguage) {
     const RecordedDialog dialog;
     const FNTranslator translator = loaded("# table\n"

@@ -54,6 +54,10 @@ TYPED_TEST(DecompositionOf, SquareSystemsAreSolved) {
     Matrix<T>::linearSolve(a, b);
     this->expectNear(b, x);
     this->expectNear(Matrix<T>::invert(a) * a, Matrix<T>::identity(5));
+    const auto one = this->random(1, 1, 3), y = this->random(1, 2, 4);
+    auto c = one * y;
+    Matrix<T>::linearSolve(one, c);
+    this->expectNear(c, y);
 }
 
 TYPED_TEST(DecompositionOf, LeastSquaresSolutionsSolveTheNormalEquations) {
