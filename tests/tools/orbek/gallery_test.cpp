@@ -159,6 +159,7 @@ TEST_F(GalleryToolWithModels, HasAllThatAKilledImportTold) {
     for (const std::size_t told : {1u, 2u, 5u}) {
         (void)std::fflush(stdout);
         scratch.write("told", ""); // what the run before has told does not count
+        const std::size_t left = people.size() - ids(gallery).size();
         const pid_t child = fork();
         if (child == 0) {
             (void)!freopen(scratch.file("told").c_str(), "w", stdout);
@@ -172,7 +173,7 @@ TEST_F(GalleryToolWithModels, HasAllThatAKilledImportTold) {
             if (static_cast<std::size_t>(lines()) >= told) kill(child, SIGKILL);
         const std::string text = scratch.read("told");
         const Ids before = idsOf({0, text.substr(0, text.rfind('\n') + 1), ""}), there = ids(gallery);
-        EXPECT_GE(before.size(), told);
+        EXPECT_GE(before.size(), std::min(told, left));
         EXPECT_TRUE(std::ranges::includes(there, before)) << there.size() << " of " << before.size();
         EXPECT_LE(there.size(), people.size());
     }
