@@ -27,11 +27,6 @@ void tell(GoldenFacts& facts, const std::string& name, const Eyes::Location& eye
     facts.number(name + ".confidence1", eyes.secondConfidence, 1e-3);
 }
 
-Configuration configured(const std::string& more = {}) {
-    std::istringstream text("ORBEK.Substitutions.INSTALLDIR = " ORBEK_BINARY_DIR "\n" + more);
-    return Configuration(text);
-}
-
 TEST(FinderGoldenWithModels, SeesFacesAndEyesWhereItDid) {
     GoldenFacts facts("finders");
     const Configuration configuration = configured();

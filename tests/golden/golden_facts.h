@@ -7,6 +7,7 @@
 #include <filesystem>
 #include <fstream>
 #include <map>
+#include <optional>
 #include <sstream>
 #include <string>
 
@@ -41,7 +42,7 @@ public:
     }
 
     void text(const std::string& name, const std::string& value) {
-        if (const std::string* const expected = take(name, value)) {
+        if (const auto expected = take(name, value)) {
             EXPECT_EQ(value, *expected) << name;
         }
     }
@@ -51,28 +52,24 @@ public:
         std::ostringstream digits;
         digits.precision(7);
         digits << value;
-        if (const std::string* const expected = take(name, digits.str())) {
+        if (const auto expected = take(name, digits.str())) {
             const double wanted = std::stod(*expected);
             EXPECT_NEAR(value, wanted, tolerance * std::max(1.0, std::abs(wanted))) << name;
         }
     }
 
 private:
-    const std::string* take(const std::string& name, const std::string& value) {
+    /// What was written down for a name; nothing while goldens are written, or if that is missing.
+    std::optional<std::string> take(const std::string& name, const std::string& value) {
         written_ << name << "\t" << value << "\n";
-        if (writesGoldens()) return nullptr;
-        const auto found = expected_.find(name);
-        if (found == expected_.end()) {
-            ADD_FAILURE() << name << " was never written down; it is " << value;
-            return nullptr;
-        }
-        taken_ = found->second;
-        expected_.erase(found);
-        return &taken_;
+        if (writesGoldens()) return {};
+        const auto found = expected_.extract(name);
+        if (found) return found.mapped();
+        ADD_FAILURE() << name << " was never written down; it is " << value;
+        return {};
     }
 
     std::filesystem::path file_;
     std::map<std::string, std::string> expected_;
-    std::string taken_;
     std::ostringstream written_;
 };

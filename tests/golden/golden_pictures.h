@@ -1,10 +1,12 @@
 #pragma once
 
 #include "golden_facts.h"
+#include "orbek/configuration.h"
 #include "orbek/image_io.h"
 
 #include <array>
 #include <functional>
+#include <sstream>
 #include <vector>
 
 /// A picture in the memory of this test, to paint on.
@@ -57,6 +59,12 @@ private:
     std::vector<Orbek::Rgb> pixels_;
     std::vector<unsigned char> gray_;
 };
+
+/// The configuration of the built tree, with further lines.
+inline Orbek::Configuration configured(const std::string& more = {}) {
+    std::istringstream text("ORBEK.Substitutions.INSTALLDIR = " ORBEK_BINARY_DIR "\n" + more);
+    return Orbek::Configuration(text);
+}
 
 /// Drawn people, see README.md.
 inline constexpr std::array drawnPeople{"plain", "open", "turned", "closed", "lit", "tilted"};

@@ -19,11 +19,6 @@ using ISO_19794_5::FullFrontal::Boundaries;
 using ISO_19794_5::FullFrontal::Compliance;
 using Portrait::Characteristics;
 
-Configuration configured(const std::string& more = {}) {
-    std::istringstream text("ORBEK.Substitutions.INSTALLDIR = " ORBEK_BINARY_DIR "\n" + more);
-    return Configuration(text);
-}
-
 template <class Of> struct Measure {
     const char* name;
     float (Of::*value)() const;

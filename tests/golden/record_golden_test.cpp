@@ -15,11 +15,6 @@ namespace {
 
 using namespace Orbek;
 
-Configuration configured(const std::string& more = {}) {
-    std::istringstream text("ORBEK.Substitutions.INSTALLDIR = " ORBEK_BINARY_DIR "\n" + more);
-    return Configuration(text);
-}
-
 std::filesystem::path stored(const std::string& name) {
     return goldenFolder() / "formats" / name;
 }

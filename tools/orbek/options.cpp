@@ -23,10 +23,6 @@ CLI::Option* add(CLI::App& command, const std::string& name, Share& share, const
         ->check(CLI::Validator(complaintOfShare, "FLOAT in [0 - 1]"));
 }
 
-} // namespace
-
-namespace {
-
 /// Options that change what the readers of pictures refuse.
 void addLimits(CLI::App& command) {
     const auto add = [&](const char* name, std::uint64_t greatest, const char* description, auto set) {
